@@ -1,0 +1,11 @@
+# Sanitizers apply to every target of a native build, so that the module, the
+# platform layer and the tests are all instrumented together.
+if(TAV_SANITIZE STREQUAL "address-undefined")
+  add_compile_options(-fsanitize=address,undefined -fno-omit-frame-pointer -fno-sanitize-recover=undefined)
+  add_link_options(-fsanitize=address,undefined)
+elseif(TAV_SANITIZE STREQUAL "thread")
+  add_compile_options(-fsanitize=thread -fno-omit-frame-pointer)
+  add_link_options(-fsanitize=thread)
+elseif(NOT TAV_SANITIZE STREQUAL "")
+  message(FATAL_ERROR "Unknown TAV_SANITIZE value: ${TAV_SANITIZE}")
+endif()

@@ -1,0 +1,23 @@
+#!/usr/bin/env bash
+# Runs a Windows executable under Wine in a throw-away prefix beside the build.
+# The first run initialises the prefix; later runs reuse it.
+set -euo pipefail
+build_dir="${TAV_WINE_BUILD_DIR:-$(pwd)}"
+while [[ ! -f "$build_dir/CMakeCache.txt" && "$build_dir" != "/" ]]; do build_dir="$(dirname "$build_dir")"; done
+[[ -f "$build_dir/CMakeCache.txt" ]] || build_dir="$(pwd)"
+export WINEPREFIX="$build_dir/wineprefix"
+export WINEDEBUG="${WINEDEBUG:--all}"
+export WINEDLLOVERRIDES="${WINEDLLOVERRIDES:-mscoree,mshtml=}"
+export WINEARCH=win64
+unset DISPLAY
+if [[ ! -f "$WINEPREFIX/system.reg" ]]; then
+  mkdir -p "$WINEPREFIX"
+  (
+    flock 9
+    if [[ ! -f "$WINEPREFIX/system.reg" ]]; then
+      wine64 wineboot --init >/dev/null 2>&1 || true
+      wineserver -w || true
+    fi
+  ) 9>"$build_dir/wineprefix.lock"
+fi
+exec wine64 "$@"

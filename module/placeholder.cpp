@@ -1,0 +1,1 @@
+// Keeps the static library non-empty until the module sources land.

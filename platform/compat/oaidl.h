@@ -1,0 +1,3 @@
+// Stands in for the Windows header of the same name on other platforms.
+#pragma once
+#include "tav/platform.h"
