@@ -1,0 +1,16 @@
+#!/usr/bin/env bash
+# Install what is missing, build all three ways and run every test:
+# native Linux with ASan/UBSan/LSan and with ThreadSanitizer, the Windows DLL
+# under Wine, and 32-bit ARM under qemu-user.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+bash scripts/install-deps.sh all
+presets=(${TAV_PRESETS:-linux linux-tsan arm mingw})
+for preset in "${presets[@]}"; do
+  echo "=== ${preset}: configure and build"
+  cmake --preset "$preset" >/dev/null
+  cmake --build --preset "$preset"
+  echo "=== ${preset}: test"
+  ctest --preset "$preset"
+done
+echo "=== all presets passed: ${presets[*]}"
