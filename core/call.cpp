@@ -1,0 +1,132 @@
+#include "core/call.h"
+
+#include "core/controller_object.h"
+#include "tav/bstr.h"
+
+namespace tav {
+namespace {
+
+ErrorSite SiteOf(const Where& where) { return ErrorSite{static_cast<int>(where.line())}; }
+
+bool CallbackTrusted(const TavInParams* rip) {
+    return rip == nullptr || rip->pCallback == nullptr ||
+           (rip->riid != nullptr && IsEqualGUID(*rip->riid, IID_ITavCommandCallback));
+}
+
+}  // namespace
+
+CommandReply::CommandReply() : record_{} { VariantInit(&record_.data); }
+
+CommandReply::~CommandReply() { VariantClear(&record_.data); }
+
+CommandReply::CommandReply(CommandReply&& other) noexcept : record_(other.record_) {
+    VariantInit(&other.record_.data);
+}
+
+void CommandReply::Clear() { VariantClear(&record_.data); }
+
+HRESULT NotifyCallback(ControllerObject& object, TavInParams* rip, HRESULT hr) {
+    if (rip == nullptr || rip->pCallback == nullptr) {
+        return hr;
+    }
+    CommandReply reply;
+    reply.Record().status = hr;
+    reply.Record().userDef = rip->userDef;
+    if (FAILED(hr)) {
+        const OleString text = object.Errors().Text();
+        reply.Data()->vt = VT_BSTR;
+        reply.Data()->bstrVal = SysAllocStringLen(text.data(), static_cast<UINT>(text.size()));
+    }
+    // The TavInParams check accepted this callback as an ITavCommandCallback.
+    static_cast<ITavCommandCallback*>(rip->pCallback)->OnCommandReply(&reply.Record());
+    return hr;
+}
+
+Call::Call(ControllerObject& object, TavInParams* rip) : object_(object), rip_(rip) {}
+
+Call& Call::ValidParams(OleStringView text, Where where) {
+    if (!failed() && !CallbackTrusted(rip_)) {
+        // The callback is not to be trusted, so it is not told.
+        hr_ = object_.Errors().Set(E_INVALIDARG, SiteOf(where), text);
+    }
+    return *this;
+}
+
+Call& Call::Initialised(OleStringView text, Where where) {
+    return Require(object_.Initialised(), E_ABORT, text, where);
+}
+
+Call& Call::Require(bool ok, HRESULT hr, OleStringView text, Where where) {
+    if (!failed() && !ok) {
+        Fail(hr, text, where);
+    }
+    return *this;
+}
+
+HRESULT Call::Fail(HRESULT hr, OleStringView text, Where where) {
+    hr_ = object_.Errors().Set(hr, SiteOf(where), text);
+    return NotifyCallback(object_, rip_, hr_);
+}
+
+SentCommand Call::Get(OleStringView command, OleStringView args, Where where) {
+    return SendTo(object_.Url(), Verb::Get, command, args, where);
+}
+
+SentCommand Call::Set(OleStringView command, OleStringView args, Where where) {
+    return SendTo(object_.Url(), Verb::Set, command, args, where);
+}
+
+SentCommand Call::Send(Verb verb, OleStringView command, OleStringView args, Where where) {
+    return SendTo(object_.Url(), verb, command, args, where);
+}
+
+SentCommand Call::SendTo(BSTR url, Verb verb, OleStringView command, OleStringView args, Where where) {
+    SentCommand sent(object_, rip_, hr_);
+    if (failed()) {
+        return sent;
+    }
+    Bstr verbText(verb == Verb::Get ? OLESTR("Get") : OLESTR("Set"));
+    Bstr commandText(command);
+    Bstr argsText(args);
+    if (verbText.IsNull() || commandText.IsNull() || argsText.IsNull()) {
+        sent.hr_ = Fail(E_OUTOFMEMORY, OLESTR("SysAllocString failed"), where);
+        return sent;
+    }
+    ITavComCtrl* component = object_.CommandComponent();
+    const HRESULT hr = component->Execute(rip_, &sent.reply_.Record(), verbText.Get(), url, commandText.Get(),
+                                          argsText.Get());
+    if (FAILED(hr)) {
+        sent.hr_ = object_.Errors().AdoptFromComponent(hr, component, SiteOf(where));
+        NotifyCallback(object_, rip_, hr);
+    }
+    return sent;
+}
+
+SentCommand::SentCommand(ControllerObject& object, TavInParams* rip, HRESULT hr)
+    : object_(object), rip_(rip), hr_(hr) {}
+
+bool SentCommand::Finished(HRESULT* result, Where where) {
+    if (FAILED(hr_)) {
+        *result = hr_;
+        return true;
+    }
+    if (IsAsync(rip_)) {
+        reply_.Clear();
+        *result = S_OK;
+        return true;
+    }
+    if (reply_.Record().status < 0) {
+        *result = object_.Errors().SetFromReply(reply_.Record(), SiteOf(where));
+        return true;
+    }
+    *result = S_OK;
+    return false;
+}
+
+HRESULT SentCommand::StatusOnly(Where where) {
+    HRESULT result;
+    Finished(&result, where);
+    return result;
+}
+
+}  // namespace tav

@@ -1,0 +1,110 @@
+#pragma once
+#include <memory>
+
+#include "TavController.h"
+#include "TavSiblings.h"
+#include "core/call.h"
+#include "core/error_info.h"
+#include "core/reply.h"
+#include "tav/bstr.h"
+#include "tav/com_ptr.h"
+#include "tav/platform.h"
+
+namespace tav {
+
+// The one controller object behind all seventeen classes. The classes differ
+// only in the class version stamped at construction, which decides what
+// QueryInterface answers and gates the newer features.
+class ControllerObject final : public ITavController6,
+                         public ITavBackupRestore2,
+                         public ITavLANAdaptor2,
+                         public ITavBoot3,
+                         public ITavSubscribe,
+                         public ITavPanel4,
+                         public ITavUser3,
+                         public ITavUAS,
+                         public ITavMastership,
+                         public ITavVirtualTime,
+                         public ITavHelperBase,
+                         public ITavDynamicDevices2,
+                         public ITavFileManagement,
+                         public ITavSystemDiagnostics,
+                         public ITavPositionalSafetyController,
+                         public ITavDorvel,
+                         public ITavIPC,
+                         public ITavIPCInformation,
+                         public ITavLumeret2,
+                         public ITavControllerTime,
+                         public ITavSafety {
+public:
+    static constexpr LONG kNewestVersion = 17;
+
+    // Creates an object of class version 1..17, aggregated when outer is set
+    // (then riid must be IID_IUnknown and the inner unknown is returned).
+    static HRESULT Create(LONG version, IUnknown* outer, REFIID riid, void** object);
+
+    // IUnknown, delegating to the controlling unknown.
+    HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override;
+    ULONG STDMETHODCALLTYPE AddRef() override;
+    ULONG STDMETHODCALLTYPE Release() override;
+
+#define TAV_CONTROLLER_METHOD(interface_, name, params, args) HRESULT STDMETHODCALLTYPE name params override;
+#include "controller_methods.inc"
+#undef TAV_CONTROLLER_METHOD
+
+    LONG Version() const { return version_; }
+    bool Initialised() const { return initialised_ != 0; }
+    ErrorInfo& Errors() { return errors_; }
+    BSTR Url() const { return url_.Get(); }
+    ITavComCtrl* CommandComponent() const { return command_.Get(); }
+    ITavCommand2* Command2() const { return command2_.Get(); }
+    ITavUser3* UserComponent() const { return user_.Get(); }
+    ITavMastership* MastershipComponent() const { return mastership_.Get(); }
+    ULONG ClientValue() const { return clientValue_; }
+
+    // The call pattern and the reply checks of every operation.
+    Call Command(TavInParams* rip) { return Call(*this, rip); }
+    Reply Decode(VARIANT* data) { return Reply(*this, data); }
+
+    // Answers riid when the class version has it; otherwise E_NOINTERFACE.
+    HRESULT FindInterface(REFIID riid, void** object);
+
+private:
+    explicit ControllerObject(LONG version, IUnknown* outer);
+    ~ControllerObject();
+    ControllerObject(const ControllerObject&) = delete;
+    ControllerObject& operator=(const ControllerObject&) = delete;
+
+    // The non-delegating unknown: the object's own identity and lifetime.
+    class Inner : public IUnknown {
+    public:
+        explicit Inner(ControllerObject* owner) : owner_(owner) {}
+        HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override;
+        ULONG STDMETHODCALLTYPE AddRef() override;
+        ULONG STDMETHODCALLTYPE Release() override;
+        ControllerObject& Owner() { return *owner_; }
+
+    private:
+        ControllerObject* owner_;
+    };
+
+    void ReleaseComponents();
+
+    // Object state, in this order.
+    ErrorInfo errors_;
+    Bstr url_;
+    ComPtr<ITavComCtrl> command_;
+    ComPtr<ITavCommand2> command2_;
+    ComPtr<ITavUser3> user_;
+    ComPtr<ITavMastership> mastership_;
+    ComPtr<ITavFile> file_;
+    BYTE initialised_ = 0;
+    const LONG version_;
+    ULONG clientValue_ = 0;
+
+    Inner inner_;
+    IUnknown* controlling_;
+    LONG volatile references_ = 0;
+};
+
+}  // namespace tav

@@ -1,0 +1,20 @@
+#pragma once
+#include <source_location>
+
+namespace tav {
+
+// Where a failure was detected. Every error text ends in the reporting unit's
+// name and the line of the statement that detected the failure, so that two
+// failures of one operation never read alike.
+struct ErrorSite {
+    int line;
+
+    static constexpr ErrorSite Here(std::source_location where = std::source_location::current()) {
+        return ErrorSite{static_cast<int>(where.line())};
+    }
+};
+
+// The name that every error suffix carries.
+inline constexpr const char kErrorSource[] = "TavControllerImpl";
+
+}  // namespace tav
