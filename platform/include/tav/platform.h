@@ -18,6 +18,10 @@
 #include "tav/com_api.h"
 #endif
 
+#include "tav/fault_injection.h"
+#include "tav/memory.h"
+#include "tav/registry_file.h"
+
 // OLECHAR is 16 bits everywhere: wchar_t on Windows, char16_t elsewhere.
 static_assert(sizeof(OLECHAR) == 2, "OLECHAR must be 16 bits");
 

@@ -1,0 +1,3 @@
+// Defines the GUIDs that com_types.h declares.
+#define INITGUID
+#include "tav/com_types.h"
