@@ -1,0 +1,44 @@
+#pragma once
+#include <chrono>
+#include <filesystem>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "tav/platform.h"
+
+namespace tavctl {
+
+// What the options before the command say.
+struct GlobalOptions {
+    std::optional<std::filesystem::path> module;
+    std::string className = "TavController17";
+    std::string url;              // empty: the embedded virtual controller
+    bool embedded = true;         // register the virtual controller in-process
+    bool async = false;
+    ULONG timeoutMs = 5000;
+    bool echo = false;            // batch: print each command before running it
+    bool keepGoing = false;       // batch: go on after a failing command
+    // Fault switches of the embedded virtual controller.
+    std::vector<std::pair<std::string, std::chrono::milliseconds>> simDelays;
+    std::vector<std::pair<std::string, HRESULT>> simFailures;
+    bool simLinkDown = false;
+};
+
+// Exit statuses.
+inline constexpr int kExitOk = 0;
+inline constexpr int kExitFailed = 1;   // an operation failed
+inline constexpr int kExitUsage = 2;    // the command line is wrong
+inline constexpr int kExitSetup = 3;    // module, class or Init failed
+
+// Parses the options in front of the command; `next` is left at the
+// command's first word. Empty (with the message printed) on a usage error;
+// `helpWanted` when --help came before any command.
+std::optional<GlobalOptions> ParseGlobalOptions(const std::vector<std::string>& args, std::size_t& next,
+                                                bool& helpWanted);
+
+// The text of tavctl --help.
+std::string GeneralHelp();
+
+}  // namespace tavctl
