@@ -4,6 +4,7 @@
 
 #include "core/array.h"
 #include "core/module_lock.h"
+#include "tav/com_ptr.h"
 #include "tav/platform.h"
 
 namespace tav {
@@ -92,10 +93,7 @@ public:
         }
         position_ = begin_;
         ownsArray_ = ownership != EnumOwnership::Borrow;
-        if (owner != nullptr) {
-            owner->AddRef();
-            owner_ = owner;
-        }
+        owner_ = ComPtr<IUnknown>(owner);
         return S_OK;
     }
 
@@ -195,7 +193,7 @@ public:
         }
         // A clone reads its own copy, yet keeps alive whoever keeps the
         // source's elements alive: the source when it owns them.
-        IUnknown* owner = ownsArray_ ? static_cast<Interface*>(this) : owner_;
+        IUnknown* owner = ownsArray_ ? static_cast<Interface*>(this) : owner_.Get();
         hr = copy->Init(begin_, end_, owner, EnumOwnership::Copy);
         if (SUCCEEDED(hr)) {
             copy->position_ = copy->begin_ + (position_ - begin_);
@@ -234,9 +232,7 @@ private:
         if (ownsArray_) {
             FreeElements<Traits>(begin_, static_cast<size_t>(end_ - begin_));
         }
-        if (owner_ != nullptr) {
-            owner_->Release();
-        }
+        owner_.Reset();
         ModuleLock::Remove();
     }
 
@@ -275,7 +271,7 @@ private:
     bool filtered_ = false;
     LONG filterMode_ = 0;  // kept after UnFilter, unused until the next Filter
     bool ownsArray_ = false;
-    IUnknown* owner_ = nullptr;  // one reference, released on destruction
+    ComPtr<IUnknown> owner_;
     LONG volatile references_ = 0;
 };
 

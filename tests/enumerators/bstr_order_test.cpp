@@ -56,10 +56,10 @@ TEST(BstrOrder, FiltersByCharacterClass) {
     }
 }
 
-std::vector<std::string> RandomList(std::mt19937& random) {
+Texts RandomList(std::mt19937& random) {
     static const char* const prefixes[] = {"", "item", "Item", "ITEM", "a", "ab", "B", "x_", "Z"};
     static const char* const suffixes[] = {"", "a", "B", "z9", "_"};
-    std::vector<std::string> list(random() % 41);
+    Texts list(random() % 41);
     for (std::string& text : list) {
         text = prefixes[random() % std::size(prefixes)];
         if (random() % 4 != 0) {
@@ -74,17 +74,17 @@ TEST(BstrOrder, SortAgreesWithAReferenceSortInEveryMode) {
     std::mt19937 random(20240607);
     for (LONG mode = 1; mode <= 8; ++mode) {
         for (int round = 0; round < 60; ++round) {
-            const std::vector<std::string> input = RandomList(random);
+            const Texts input = RandomList(random);
             auto after = [mode](const std::string& a, const std::string& b) {
                 return BstrOutOfOrder(Widen(a).c_str(), Widen(b).c_str(), mode);
             };
-            std::vector<std::string> reference = input;
+            Texts reference = input;
             std::stable_sort(reference.begin(), reference.end(),
                              [&](const std::string& x, const std::string& y) { return after(y, x); });
 
-            Ref<ITavEnumBSTR> strings = MakeStrings(input);
+            ComPtr<ITavEnumBSTR> strings = MakeStrings(input);
             ASSERT_EQ(S_OK, strings->Sort(mode));
-            const std::vector<std::string> sorted = Fetch(strings.get()).texts;
+            const Texts sorted = Fetch(strings).texts;
 
             ASSERT_TRUE(std::is_permutation(sorted.begin(), sorted.end(), input.begin(), input.end()));
             for (size_t i = 0; i < sorted.size(); ++i) {
@@ -96,18 +96,18 @@ TEST(BstrOrder, SortAgreesWithAReferenceSortInEveryMode) {
 }
 
 TEST(BstrOrder, UnknownModeScramblesInAFixedPattern) {
-    Ref<ITavEnumBSTR> abc = MakeStrings({"a", "b", "c"});
+    ComPtr<ITavEnumBSTR> abc = MakeStrings({"a", "b", "c"});
     ASSERT_EQ(S_OK, abc->Sort(42));
-    EXPECT_EQ((std::vector<std::string>{"b", "a", "c"}), Fetch(abc.get()).texts);
+    EXPECT_EQ((Texts{"b", "a", "c"}), Fetch(abc).texts);
 
     std::mt19937 random(7);
-    std::vector<std::string> input = RandomList(random);
+    Texts input = RandomList(random);
     while (input.size() < 10) input = RandomList(random);
-    Ref<ITavEnumBSTR> first = MakeStrings(input);
-    Ref<ITavEnumBSTR> second = MakeStrings(input);
+    ComPtr<ITavEnumBSTR> first = MakeStrings(input);
+    ComPtr<ITavEnumBSTR> second = MakeStrings(input);
     first->Sort(0);
     second->Sort(0);
-    EXPECT_EQ(Fetch(first.get()).texts, Fetch(second.get()).texts);
+    EXPECT_EQ(Fetch(first).texts, Fetch(second).texts);
 }
 
 }  // namespace
