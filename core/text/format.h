@@ -42,7 +42,7 @@ inline constexpr bool kNoFormatArg = false;
 
 template <typename T>
 FormatArg MakeFormatArg(const T& arg) noexcept {
-    using D = std::decay_t<T>;
+    using D = std::decay_t<const T&>;
     if constexpr (std::is_null_pointer_v<D>) {
         return {FormatArgKind::NullText, 0, nullptr, 0};
     } else if constexpr (std::is_enum_v<D>) {

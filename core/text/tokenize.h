@@ -9,7 +9,8 @@ namespace tav::text {
 // Splits a text at any of a set of delimiters as repeated wcstok calls do:
 // runs of delimiters are skipped, so no token is empty, and the delimiter
 // that ends a token is consumed with it. Unlike wcstok it keeps its state in
-// the object and writes nothing. The text ends at its first NUL.
+// the object and writes nothing. The text ends at its first NUL. Both texts
+// are views: they must outlive the tokenizer.
 class Tokenizer {
 public:
     Tokenizer(OleStringView text, OleStringView delimiters) noexcept
