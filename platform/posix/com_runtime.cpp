@@ -34,7 +34,7 @@ void CoUninitialize(void) {
     if (initialisations > 0) --initialisations;
 }
 
-HRESULT CoGetClassObject(REFCLSID rclsid, DWORD dwClsContext, COSERVERINFO*, REFIID riid, LPVOID* ppv) {
+HRESULT CoGetClassObject(REFCLSID rclsid, DWORD dwClsContext, LPVOID, REFIID riid, LPVOID* ppv) {
     if (ppv == nullptr) return E_INVALIDARG;
     *ppv = nullptr;
     if (IUnknown* registered = tav::posix::FindRegisteredClassObject(rclsid, dwClsContext)) {

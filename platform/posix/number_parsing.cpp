@@ -99,7 +99,7 @@ HRESULT ParseDecimal(const OLECHAR* p, ULONG* out) {
 
 }  // namespace
 
-extern "C" HRESULT VarUI4FromStr(LPCOLESTR strIn, LCID, ULONG, ULONG* pulOut) {
+extern "C" HRESULT VarUI4FromStr(OLECHAR* strIn, LCID, ULONG, ULONG* pulOut) {
     if (strIn == nullptr || pulOut == nullptr) return E_INVALIDARG;
     const OLECHAR* p = SkipBlanks(strIn);
     if (p[0] == u'&' && (p[1] == u'H' || p[1] == u'h')) return ParseRadix(p + 2, 16, pulOut);

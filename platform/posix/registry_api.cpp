@@ -22,7 +22,20 @@ constexpr std::size_t longestKeyName = 255;
 struct KeyLocation {
     RegistryRoot root = RegistryRoot::LocalMachine;
     std::vector<std::u16string> path;
+    REGSAM access = KEY_ALL_ACCESS;
+
+    // As Windows does, the rights asked for at opening limit what the handle may do.
+    bool Allows(REGSAM right) const { return (access & right) == right; }
 };
+
+REGSAM SpecificRights(REGSAM desired) {
+    if (desired & (MAXIMUM_ALLOWED | GENERIC_ALL)) return KEY_ALL_ACCESS;
+    REGSAM rights = desired & KEY_ALL_ACCESS;
+    if (desired & GENERIC_READ) rights |= KEY_READ;
+    if (desired & GENERIC_WRITE) rights |= KEY_WRITE;
+    if (desired & GENERIC_EXECUTE) rights |= KEY_EXECUTE;
+    return rights;
+}
 
 class OpenKeys {
 public:
@@ -129,7 +142,8 @@ template <typename Body> LSTATUS Guarded(Body&& body) {
     }
 }
 
-LSTATUS OpenOrCreate(HKEY hKey, LPCWSTR lpSubKey, bool create, PHKEY phkResult, LPDWORD lpdwDisposition) {
+LSTATUS OpenOrCreate(HKEY hKey, LPCWSTR lpSubKey, bool create, REGSAM access, PHKEY phkResult,
+                     LPDWORD lpdwDisposition) {
     if (phkResult == nullptr) return ERROR_INVALID_PARAMETER;
     *phkResult = nullptr;
     auto base = OpenKeys::Instance().Find(hKey);
@@ -139,6 +153,7 @@ LSTATUS OpenOrCreate(HKEY hKey, LPCWSTR lpSubKey, bool create, PHKEY phkResult, 
     if (status != ERROR_SUCCESS) return status;
     KeyLocation target = *base;
     target.path.insert(target.path.end(), names.begin(), names.end());
+    target.access = SpecificRights(access);
     bool createdLast = false;
     auto& store = RegistryStore::Instance();
     if (create) {
@@ -194,13 +209,13 @@ extern "C" {
 
 void TavSetRegistryFile(const char* path) { RegistryStore::Instance().UseFile(path == nullptr ? "" : path); }
 
-LSTATUS RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD, LPWSTR, DWORD, REGSAM, const LPSECURITY_ATTRIBUTES,
-                        PHKEY phkResult, LPDWORD lpdwDisposition) {
-    return Guarded([&] { return OpenOrCreate(hKey, lpSubKey, true, phkResult, lpdwDisposition); });
+LSTATUS RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD, LPWSTR, DWORD, REGSAM samDesired,
+                        const LPSECURITY_ATTRIBUTES, PHKEY phkResult, LPDWORD lpdwDisposition) {
+    return Guarded([&] { return OpenOrCreate(hKey, lpSubKey, true, samDesired, phkResult, lpdwDisposition); });
 }
 
-LSTATUS RegOpenKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD, REGSAM, PHKEY phkResult) {
-    return Guarded([&] { return OpenOrCreate(hKey, lpSubKey, false, phkResult, nullptr); });
+LSTATUS RegOpenKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD, REGSAM samDesired, PHKEY phkResult) {
+    return Guarded([&] { return OpenOrCreate(hKey, lpSubKey, false, samDesired, phkResult, nullptr); });
 }
 
 LSTATUS RegCloseKey(HKEY hKey) {
@@ -213,6 +228,7 @@ LSTATUS RegSetValueExW(HKEY hKey, LPCWSTR lpValueName, DWORD, DWORD dwType, cons
         if (lpData == nullptr && cbData != 0) return ERROR_INVALID_PARAMETER;
         auto location = OpenKeys::Instance().Find(hKey);
         if (!location) return ERROR_INVALID_HANDLE;
+        if (!location->Allows(KEY_SET_VALUE)) return ERROR_ACCESS_DENIED;
         std::vector<BYTE> data(lpData, lpData + cbData);
         return RegistryStore::Instance().Write([&](RegistryTree& tree, bool& changed) -> LSTATUS {
             RegistryKey* key = Locate(tree, *location);
@@ -227,6 +243,7 @@ LSTATUS RegQueryValueExW(HKEY hKey, LPCWSTR lpValueName, LPDWORD, LPDWORD lpType
     return Guarded([&]() -> LSTATUS {
         auto location = OpenKeys::Instance().Find(hKey);
         if (!location) return ERROR_INVALID_HANDLE;
+        if (!location->Allows(KEY_QUERY_VALUE)) return ERROR_ACCESS_DENIED;
         return RegistryStore::Instance().Read([&](const RegistryTree& tree) -> LSTATUS {
             const RegistryKey* key = Locate(tree, *location);
             if (key == nullptr) return ERROR_KEY_DELETED;
@@ -241,6 +258,7 @@ LSTATUS RegDeleteValueW(HKEY hKey, LPCWSTR lpValueName) {
     return Guarded([&]() -> LSTATUS {
         auto location = OpenKeys::Instance().Find(hKey);
         if (!location) return ERROR_INVALID_HANDLE;
+        if (!location->Allows(KEY_SET_VALUE)) return ERROR_ACCESS_DENIED;
         return RegistryStore::Instance().Write([&](RegistryTree& tree, bool& changed) -> LSTATUS {
             RegistryKey* key = Locate(tree, *location);
             if (key == nullptr) return ERROR_KEY_DELETED;
@@ -275,6 +293,7 @@ LSTATUS RegEnumKeyExW(HKEY hKey, DWORD dwIndex, LPWSTR lpName, LPDWORD lpcchName
     return Guarded([&]() -> LSTATUS {
         auto location = OpenKeys::Instance().Find(hKey);
         if (!location) return ERROR_INVALID_HANDLE;
+        if (!location->Allows(KEY_ENUMERATE_SUB_KEYS)) return ERROR_ACCESS_DENIED;
         return RegistryStore::Instance().Read([&](const RegistryTree& tree) -> LSTATUS {
             const RegistryKey* key = Locate(tree, *location);
             if (key == nullptr) return ERROR_KEY_DELETED;
@@ -295,6 +314,7 @@ LSTATUS RegEnumValueW(HKEY hKey, DWORD dwIndex, LPWSTR lpValueName, LPDWORD lpcc
     return Guarded([&]() -> LSTATUS {
         auto location = OpenKeys::Instance().Find(hKey);
         if (!location) return ERROR_INVALID_HANDLE;
+        if (!location->Allows(KEY_QUERY_VALUE)) return ERROR_ACCESS_DENIED;
         return RegistryStore::Instance().Read([&](const RegistryTree& tree) -> LSTATUS {
             const RegistryKey* key = Locate(tree, *location);
             if (key == nullptr) return ERROR_KEY_DELETED;

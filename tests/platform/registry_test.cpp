@@ -104,14 +104,33 @@ TEST_F(Registry, NamesAreFoundWhateverTheirCase) {
     ASSERT_EQ(SetString(key, OLESTR("ThreadingModel"), OLESTR("Both")), ERROR_SUCCESS);
     RegCloseKey(key);
 
-    HKEY other = nullptr;
-    ASSERT_EQ(Open(OLESTR("INPROCSERVER32"), other), ERROR_SUCCESS);
+    HKEY other = Create(OLESTR("INPROCSERVER32"));
     EXPECT_EQ(QueryString(other, OLESTR("threadingmodel")), OLESTR("Both"));
     ASSERT_EQ(SetString(other, OLESTR("THREADINGMODEL"), OLESTR("Free")), ERROR_SUCCESS);
     EXPECT_EQ(QueryString(other, OLESTR("ThreadingModel")), OLESTR("Free"));
     RegCloseKey(other);
     // The name keeps the case it was created with.
     EXPECT_EQ(SubkeyNames(sandbox.Key()), std::vector<OleString>{OLESTR("InprocServer32")});
+}
+
+TEST_F(Registry, TheRightsAskedForLimitTheHandle) {
+    HKEY key = Create(OLESTR("Guarded"));
+    SetString(key, OLESTR("Value"), OLESTR("x"));
+    RegCloseKey(key);
+
+    ASSERT_EQ(RegOpenKeyExW(sandbox.Key(), OLESTR("Guarded"), 0, KEY_READ, &key), ERROR_SUCCESS);
+    EXPECT_EQ(QueryString(key, OLESTR("Value")), OLESTR("x"));
+    EXPECT_EQ(SetString(key, OLESTR("Value"), OLESTR("y")), ERROR_ACCESS_DENIED);
+    EXPECT_EQ(RegDeleteValueW(key, OLESTR("Value")), ERROR_ACCESS_DENIED);
+    RegCloseKey(key);
+
+    ASSERT_EQ(RegOpenKeyExW(sandbox.Key(), OLESTR("Guarded"), 0, KEY_SET_VALUE, &key), ERROR_SUCCESS);
+    EXPECT_EQ(SetString(key, OLESTR("Value"), OLESTR("y")), ERROR_SUCCESS);
+    EXPECT_EQ(RegQueryValueExW(key, OLESTR("Value"), nullptr, nullptr, nullptr, nullptr), ERROR_ACCESS_DENIED);
+    OLECHAR name[16];
+    DWORD length = 16;
+    EXPECT_EQ(RegEnumKeyExW(key, 0, name, &length, nullptr, nullptr, nullptr, nullptr), ERROR_ACCESS_DENIED);
+    RegCloseKey(key);
 }
 
 TEST_F(Registry, EnumeratesSubkeysAndValues) {

@@ -1,6 +1,8 @@
 // The COM, OLE Automation and kernel functions that the platform layer
 // implements on non-Windows platforms, with the names, signatures and
-// results of their Windows counterparts.
+// results of their Windows counterparts. Where MinGW's declarations differ
+// from the Windows SDK's (a missing const), these follow MinGW, so that what
+// compiles here compiles for Windows too.
 #pragma once
 #include "tav/com_types.h"
 
@@ -21,8 +23,8 @@ TAV_PLATFORM_API UINT SysStringByteLen(BSTR bstr);
 // VT_UNKNOWN, VT_DISPATCH and any VT_BYREF; other types give DISP_E_BADVARTYPE.
 TAV_PLATFORM_API void VariantInit(VARIANTARG* pvarg);
 TAV_PLATFORM_API HRESULT VariantClear(VARIANTARG* pvarg);
-TAV_PLATFORM_API HRESULT VariantCopy(VARIANTARG* pvargDest, VARIANTARG* pvargSrc);  // source not const, as MinGW declares it
-TAV_PLATFORM_API HRESULT VarUI4FromStr(LPCOLESTR strIn, LCID lcid, ULONG dwFlags, ULONG* pulOut);
+TAV_PLATFORM_API HRESULT VariantCopy(VARIANTARG* pvargDest, VARIANTARG* pvargSrc);  // not const, as MinGW
+TAV_PLATFORM_API HRESULT VarUI4FromStr(OLECHAR* strIn, LCID lcid, ULONG dwFlags, ULONG* pulOut);  // not const, as MinGW
 
 // Task memory.
 TAV_PLATFORM_API LPVOID CoTaskMemAlloc(SIZE_T cb);
@@ -46,8 +48,8 @@ TAV_PLATFORM_API void CoUninitialize(void);
 TAV_PLATFORM_API HRESULT CoRegisterClassObject(REFCLSID rclsid, LPUNKNOWN pUnk, DWORD dwClsContext, DWORD flags,
                                                LPDWORD lpdwRegister);
 TAV_PLATFORM_API HRESULT CoRevokeClassObject(DWORD dwRegister);
-TAV_PLATFORM_API HRESULT CoGetClassObject(REFCLSID rclsid, DWORD dwClsContext, COSERVERINFO* pServerInfo,
-                                          REFIID riid, LPVOID* ppv);
+TAV_PLATFORM_API HRESULT CoGetClassObject(REFCLSID rclsid, DWORD dwClsContext, LPVOID pvReserved, REFIID riid,
+                                          LPVOID* ppv);
 TAV_PLATFORM_API HRESULT CoCreateInstance(REFCLSID rclsid, LPUNKNOWN pUnkOuter, DWORD dwClsContext, REFIID riid,
                                           LPVOID* ppv);
 TAV_PLATFORM_API void CoFreeUnusedLibraries(void);

@@ -210,7 +210,6 @@ typedef struct _RTL_CRITICAL_SECTION {
 } CRITICAL_SECTION, *PCRITICAL_SECTION, *LPCRITICAL_SECTION;
 
 typedef struct tagSAFEARRAY SAFEARRAY;
-typedef struct _COSERVERINFO COSERVERINFO;
 
 #define SUCCEEDED(hr) (((HRESULT)(hr)) >= 0)
 #define FAILED(hr) (((HRESULT)(hr)) < 0)
@@ -362,6 +361,11 @@ typedef struct _COSERVERINFO COSERVERINFO;
 #define KEY_WOW64_64KEY 0x0100
 #define KEY_WOW64_32KEY 0x0200
 #define KEY_READ 0x20019
+#define MAXIMUM_ALLOWED 0x02000000L
+#define GENERIC_READ 0x80000000L
+#define GENERIC_WRITE 0x40000000L
+#define GENERIC_EXECUTE 0x20000000L
+#define GENERIC_ALL 0x10000000L
 #define KEY_WRITE 0x20006
 #define KEY_EXECUTE KEY_READ
 #define KEY_ALL_ACCESS 0xF003F
@@ -455,6 +459,7 @@ typedef struct tagVARIANT {
         } brecVal;
     };
 } VARIANT;
+static_assert(sizeof(VARIANT) == (sizeof(void*) == 4 ? 16 : 24), "VARIANT must keep the Windows layout");
 typedef VARIANT VARIANTARG;
 typedef VARIANT* LPVARIANT;
 typedef VARIANT* LPVARIANTARG;
