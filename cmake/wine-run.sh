@@ -10,14 +10,18 @@ export WINEDEBUG="${WINEDEBUG:--all}"
 export WINEDLLOVERRIDES="${WINEDLLOVERRIDES:-mscoree,mshtml=}"
 export WINEARCH=win64
 unset DISPLAY
+# Debian's wine64 package keeps its programs out of PATH.
+export PATH="$PATH:/usr/lib/wine"
+wine="$(command -v wine64 || command -v wine)"
+wineserver="$(command -v wineserver64 || command -v wineserver || true)"
 if [[ ! -f "$WINEPREFIX/system.reg" ]]; then
   mkdir -p "$WINEPREFIX"
   (
     flock 9
     if [[ ! -f "$WINEPREFIX/system.reg" ]]; then
-      wine64 wineboot --init >/dev/null 2>&1 || true
-      wineserver -w || true
+      "$wine" wineboot --init >/dev/null 2>&1 || true
+      [[ -n "$wineserver" ]] && "$wineserver" -w || true
     fi
   ) 9>"$build_dir/wineprefix.lock"
 fi
-exec wine64 "$@"
+exec "$wine" "$@"
