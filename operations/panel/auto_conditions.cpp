@@ -195,8 +195,8 @@ HRESULT UnpackAutoConditions2(ControllerObject& object, VARIANT* data, LONG* cha
             return DecodeConditionList<AutoCondition2Traits>(
                 reply, texts, change, conditions, [cycle](TavAutoCondition2& record, const ConditionElement& element) {
                     record.Condition = Version2Condition(element.name);
-                    record.Configuration = element.second != 0 ? TavAutoConditionConfiguration_Reset
-                                                               : TavAutoConditionConfiguration_Keep;
+                    record.Configuration =
+                        element.second != 0 ? TavAutoConditionConfiguration_Reset : TavAutoConditionConfiguration_Keep;
                     // The run mode's cycle rides on its identifier field.
                     if (cycle != nullptr && element.name == OLESTR("RunMode")) {
                         *cycle = element.third;

@@ -26,14 +26,32 @@ const OLECHAR* ModeRequest(TavOperationMode mode) {
     }
 }
 
+// The conditions after "AUTO_CH" and its separator.
+HRESULT DecodeAutoChangeConditions(ControllerObject& object, Reply& reply, OleStringView text,
+                                   IEnumAutoCondition2** conditions, ULONG* cycle) {
+    *conditions = nullptr;
+    // Also "AUTO_CH" alone: there is no list to read.
+    if (text.size() <= kConditionListAt) {
+        return reply.Fail(E_FAIL, OLESTR("UnpackOperationMode2. No autocond string"));
+    }
+    Bstr listText(text.substr(kConditionListAt));
+    if (listText.IsNull()) {
+        return reply.Fail(E_OUTOFMEMORY, OLESTR("SysAllocString failed"));
+    }
+    Variant list;
+    list.SetBstr(std::move(listText));
+    LONG listChange = 0;  // the list's own change flag, of no use beside the mode
+    return UnpackAutoConditions2(object, list.Get(), &listChange, conditions, cycle);
+}
+
 }  // namespace
 
 HRESULT ControllerObject::GetOperationMode(TavInParams* pRip, TavOperationMode* pMode) {
     return GetOperationMode2(pRip, pMode, nullptr, nullptr);
 }
 
-HRESULT ControllerObject::GetOperationMode2(TavInParams* pRip, TavOperationMode* pMode,
-                                            IEnumAutoCondition2** ppenum, ULONG* pCycle) {
+HRESULT ControllerObject::GetOperationMode2(TavInParams* pRip, TavOperationMode* pMode, IEnumAutoCondition2** ppenum,
+                                            ULONG* pCycle) {
     return Command(pRip)
         .ValidParams(OLESTR("GetOperationMode. Invalid TavInParams."))
         .OutPointer(pMode, OLESTR("GetOperationMode. Invalid out-parameter."))
@@ -66,8 +84,8 @@ HRESULT ControllerObject::UnpackOperationMode(VARIANT* pData, TavOperationMode* 
 // A mode reply is a bare word, or "AUTO_CH", one separator and the condition
 // list. The conditions (and the run mode's cycle) are decoded only for a
 // caller that asks for them. The mode is written only on success.
-HRESULT ControllerObject::UnpackOperationMode2(VARIANT* pData, TavOperationMode* pMode,
-                                               IEnumAutoCondition2** ppenum, ULONG* pCycle) {
+HRESULT ControllerObject::UnpackOperationMode2(VARIANT* pData, TavOperationMode* pMode, IEnumAutoCondition2** ppenum,
+                                               ULONG* pCycle) {
     ULONG noCycle = 0;
     return Decode(pData)
         .Initialised()
@@ -78,36 +96,26 @@ HRESULT ControllerObject::UnpackOperationMode2(VARIANT* pData, TavOperationMode*
         .Then([&](Reply& reply) {
             const OleStringView text = panel::ReplyText(reply);
             const auto steady = panel::FindWord<TavOperationMode>(
-                text, {{OLESTR("AUTO"), Auto}, {OLESTR("INIT"), InitOp}, {OLESTR("MANR"), Manr}, {OLESTR("MANF"), Manf}});
+                text,
+                {{OLESTR("AUTO"), Auto}, {OLESTR("INIT"), InitOp}, {OLESTR("MANR"), Manr}, {OLESTR("MANF"), Manf}});
             if (steady) {
                 *pMode = *steady;
                 return S_OK;
             }
             if (!text.starts_with(kAutoChangePrefix)) {
-                return reply.Word<TavOperationMode>(text, {{OLESTR("MANF_CH"), ManfChange}, {OLESTR("UNDEF"), UndefinedMode}},
+                // Unknown modes are reported with version 1's text.
+                return reply.Word<TavOperationMode>(text,
+                                                    {{OLESTR("MANF_CH"), ManfChange}, {OLESTR("UNDEF"), UndefinedMode}},
                                                     pMode, OLESTR("UnpackOperationMode. Unsupported mode %s."));
             }
-            if (ppenum == nullptr) {
-                *pMode = AutoChange;
-                return S_OK;
+            if (ppenum != nullptr) {
+                const HRESULT hr = DecodeAutoChangeConditions(*this, reply, text, ppenum, pCycle);
+                if (FAILED(hr)) {
+                    return hr;
+                }
             }
-            *ppenum = nullptr;
-            // Also "AUTO_CH" alone: there is no list to read.
-            if (text.size() <= kConditionListAt) {
-                return reply.Fail(E_FAIL, OLESTR("UnpackOperationMode2. No autocond string"));
-            }
-            Bstr listText(text.substr(kConditionListAt));
-            if (listText.IsNull()) {
-                return reply.Fail(E_OUTOFMEMORY, OLESTR("SysAllocString failed"));
-            }
-            Variant list;
-            list.SetBstr(std::move(listText));
-            LONG listChange = 0;  // the list's own change flag, of no use beside the mode
-            const HRESULT hr = UnpackAutoConditions2(*this, list.Get(), &listChange, ppenum, pCycle);
-            if (SUCCEEDED(hr)) {
-                *pMode = AutoChange;
-            }
-            return hr;
+            *pMode = AutoChange;
+            return S_OK;
         });
 }
 
