@@ -1,1 +1,0 @@
-// Keeps the static library non-empty until the module sources land.

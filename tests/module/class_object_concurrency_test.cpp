@@ -1,0 +1,75 @@
+// Many threads asking for the class objects at once, for the
+// ThreadSanitizer build: each class still gets exactly one class object.
+#include <gtest/gtest.h>
+
+#include <latch>
+#include <thread>
+#include <vector>
+
+#include "module/class_objects.h"
+#include "module_test_support.h"
+
+namespace tav::test {
+namespace {
+
+TEST(ClassObjectConcurrency, SimultaneousFirstUseMakesOneClassObjectPerClass) {
+    constexpr int kThreads = 8;
+    for (int round = 0; round < 5; ++round) {
+        ReleaseClassObjects();
+        std::latch start(kThreads);
+        std::vector<std::vector<IUnknown*>> seen(kThreads, std::vector<IUnknown*>(kClasses.size()));
+        std::vector<std::thread> threads;
+        for (int t = 0; t < kThreads; ++t) {
+            threads.emplace_back([&, t] {
+                start.arrive_and_wait();
+                // Half the threads walk the table backwards, so rows are contended from both ends.
+                for (size_t k = 0; k < kClasses.size(); ++k) {
+                    const size_t row = t % 2 == 0 ? k : kClasses.size() - 1 - k;
+                    DllGetClassObject(*kClasses[row].clsid, IID_IUnknown, reinterpret_cast<void**>(&seen[t][row]));
+                }
+            });
+        }
+        for (std::thread& thread : threads) {
+            thread.join();
+        }
+        for (size_t row = 0; row < kClasses.size(); ++row) {
+            ASSERT_NE(seen[0][row], nullptr) << kClasses[row].name;
+            for (int t = 1; t < kThreads; ++t) {
+                EXPECT_EQ(seen[t][row], seen[0][row]) << kClasses[row].name << " thread " << t;
+            }
+            for (int t = 0; t < kThreads; ++t) {
+                seen[t][row]->Release();
+            }
+        }
+    }
+    EXPECT_EQ(DllCanUnloadNow(), S_OK);
+}
+
+TEST(ClassObjectConcurrency, ObjectsCreatedAndReleasedOnManyThreadsBalanceTheLockCount) {
+    constexpr int kThreads = 8;
+    std::latch start(kThreads);
+    std::vector<std::thread> threads;
+    for (int t = 0; t < kThreads; ++t) {
+        threads.emplace_back([&, t] {
+            start.arrive_and_wait();
+            for (int i = 0; i < 50; ++i) {
+                ComPtr<IClassFactory> factory;
+                if (ClassObjectFor(kClasses[(t + i) % kClasses.size()], factory) != S_OK) {
+                    ADD_FAILURE() << "no class object";
+                    return;
+                }
+                ComPtr<ITavController> object;
+                EXPECT_EQ(factory->CreateInstance(nullptr, IID_ITavController, Out(object)), S_OK);
+                factory->LockServer(TRUE);
+                factory->LockServer(FALSE);
+            }
+        });
+    }
+    for (std::thread& thread : threads) {
+        thread.join();
+    }
+    EXPECT_EQ(DllCanUnloadNow(), S_OK);
+}
+
+}  // namespace
+}  // namespace tav::test
