@@ -1,5 +1,6 @@
-// Identity, names and version information: what each operation sends, how its
-// Sync reply comes back, and which arguments are refused before sending.
+// Identity, names and version information: the common checks of each
+// operation, what it sends, how its Sync reply comes back, and which
+// arguments are refused before sending.
 #include <functional>
 #include <optional>
 
@@ -15,73 +16,22 @@ using BstrOp = std::function<HRESULT(ControllerObject&, TavInParams*, BSTR*)>;
 class IdentityCommandsTest : public ControllerTest {
 protected:
     // The common texts of a reading operation.
-    static CallPattern Reading(const std::string& name, BstrOp op);
-    static CallPattern Writing(const std::string& name, std::function<HRESULT(ControllerObject&, TavInParams*)> op);
+    static CallPattern Reading(const std::string& name, BstrOp op) {
+        CallPattern pattern;
+        pattern.call = [op](ControllerObject& object, TavInParams* rip, bool nullOut) {
+            TestBstr out;
+            return op(object, rip, nullOut ? nullptr : out.Out());
+        };
+        pattern.invalidParams = name + ": Invalid TavInParams";
+        pattern.nullOut = name + ": Invalid out-pointer";
+        pattern.beforeInit = name + ". TavController used before Initialized";
+        return pattern;
+    }
 };
 
-ControllerTest::CallPattern IdentityCommandsTest::Reading(const std::string& name, BstrOp op) {
-    CallPattern pattern;
-    pattern.call = [op](ControllerObject& object, TavInParams* rip, bool nullOut) {
-        TestBstr out;
-        return op(object, rip, nullOut ? nullptr : out.Out());
-    };
-    pattern.invalidParams = name + ": Invalid TavInParams";
-    pattern.nullOut = name + ": Invalid out-pointer";
-    pattern.beforeInit = name + ". TavController used before Initialized";
-    return pattern;
-}
-
-ControllerTest::CallPattern IdentityCommandsTest::Writing(const std::string& name,
-                                                          std::function<HRESULT(ControllerObject&, TavInParams*)> op) {
-    CallPattern pattern;
-    pattern.call = [op](ControllerObject& object, TavInParams* rip, bool) { return op(object, rip); };
-    pattern.invalidParams = name + ": Invalid TavInParams";
-    pattern.beforeInit = "TavController used before Initialized";
-    return pattern;
-}
-
-TEST_F(IdentityCommandsTest, EveryCommandFollowsTheCallPattern) {
-    TestBstr name("x");
-    auto versionInfo = Reading("TavController::GetVersionInfo", [](auto& o, auto* rip, BSTR* out) {
-        return o.GetVersionInfo(rip, SystemInfo, out);
-    });
-    versionInfo.invalidParams += ".";
-    auto option = Reading("IsOptionPresent", [&](auto& o, auto* rip, BSTR* out) {
-        LONG present = 0;
-        return o.IsOptionPresent(rip, name.Get(), out ? &present : nullptr);
-    });
-    option.nullOut = "IsOptionPresent. Invalid out-pointer";
-    auto energy = Reading("GetEnergyState", [](auto& o, auto* rip, BSTR* out) {
-        TavSysEnergyState state{};
-        return o.GetSysEnergyState(rip, out ? &state : nullptr);
-    });
-    const CallPattern patterns[] = {
-        versionInfo, option, energy,
-        Reading("GetVersionInfoFromSystem",
-                [&](auto& o, auto* rip, BSTR* out) { return o.GetVersionInfoFromSystem(rip, name.Get(), ReleaseInfo, out); }),
-        Reading("GetControllerName", [](auto& o, auto* rip, BSTR* out) { return o.GetControllerName(rip, out); }),
-        Reading("GetControllerID", [](auto& o, auto* rip, BSTR* out) { return o.GetControllerID(rip, out); }),
-        Reading("GetSystemID", [](auto& o, auto* rip, BSTR* out) { return o.GetSystemID(rip, out); }),
-        Reading("GetEnvironmentVariable",
-                [&](auto& o, auto* rip, BSTR* out) { return o.GetEnvironmentVariable(rip, name.Get(), out); }),
-        Reading("GetConnectedTavAPIClients",
-                [](auto& o, auto* rip, BSTR* out) { return o.GetConnectedTavAPIClients(rip, out); }),
-        Reading("GetVersionName", [](auto& o, auto* rip, BSTR* out) { return o.GetVersionName(rip, out); }),
-        Reading("GetProductVersionName",
-                [&](auto& o, auto* rip, BSTR* out) { return o.GetProductVersionName(rip, name.Get(), out); }),
-        Writing("SetControllerName", [&](auto& o, auto* rip) { return o.SetControllerName(rip, name.Get()); }),
-        Writing("SetControllerId", [&](auto& o, auto* rip) { return o.SetControllerId(rip, name.Get()); }),
-        Writing("SetLanguage", [&](auto& o, auto* rip) { return o.SetLanguage(rip, name.Get()); }),
-    };
-    for (const auto& pattern : patterns) {
-        SCOPED_TRACE(pattern.invalidParams);
-        ExpectCallPattern(pattern);
-    }
-}
-
-// Each reading command as sent, and its Sync reply as the caller gets it.
-TEST_F(IdentityCommandsTest, ReadsSendTheirCommandAndDecodeTheReply) {
+TEST_F(IdentityCommandsTest, ReadsFollowTheCallPatternSendTheirCommandAndDecodeTheReply) {
     struct Case {
+        const char* name;  // in the texts of the common checks
         BstrOp call;
         const char* command;
         const char* args;
@@ -91,31 +41,38 @@ TEST_F(IdentityCommandsTest, ReadsSendTheirCommandAndDecodeTheReply) {
     };
     TestBstr system("Sys 1"), variable("HOME"), product("Vision");
     const Case cases[] = {
-        {[](auto& o, auto* rip, BSTR* out) { return o.GetVersionInfo(rip, SystemInfo, out); }, "VersionInfo",
-         "-Type System", "OS 7 \"as it is\"", "OS 7 \"as it is\""},
-        {[](auto& o, auto* rip, BSTR* out) { return o.GetVersionInfo(rip, ReleaseInfo, out); }, "VersionInfo",
-         "-Type Release", "R 1", "R 1"},
-        {[&](auto& o, auto* rip, BSTR* out) { return o.GetVersionInfoFromSystem(rip, system.Get(), ReleaseInfo, out); },
+        {"TavController::GetVersionInfo", [](auto& o, auto* rip, BSTR* out) { return o.GetVersionInfo(rip, SystemInfo, out); },
+         "VersionInfo", "-Type System", "OS 7 \"as it is\"", "OS 7 \"as it is\""},
+        {"TavController::GetVersionInfo", [](auto& o, auto* rip, BSTR* out) { return o.GetVersionInfo(rip, ReleaseInfo, out); },
+         "VersionInfo", "-Type Release", "R 1", "R 1"},
+        {"GetVersionInfoFromSystem",
+         [&](auto& o, auto* rip, BSTR* out) { return o.GetVersionInfoFromSystem(rip, system.Get(), ReleaseInfo, out); },
          "SystemInfo", "-Type Release -SystemName \"Sys 1\"", "R 2", "R 2"},
-        {[](auto& o, auto* rip, BSTR* out) { return o.GetControllerName(rip, out); }, "CtrlName", "",
-         "-Name \"Cell 4\"", "Cell 4"},
-        {[](auto& o, auto* rip, BSTR* out) { return o.GetControllerID(rip, out); }, "CtrlID", "", "-ID \"42-A\"",
-         "42-A"},
-        {[](auto& o, auto* rip, BSTR* out) { return o.GetSystemID(rip, out); }, "GUID", "",
+        {"GetControllerName", [](auto& o, auto* rip, BSTR* out) { return o.GetControllerName(rip, out); }, "CtrlName",
+         "", "-Name \"Cell 4\"", "Cell 4"},
+        {"GetControllerID", [](auto& o, auto* rip, BSTR* out) { return o.GetControllerID(rip, out); }, "CtrlID", "",
+         "-ID \"42-A\"", "42-A"},
+        {"GetSystemID", [](auto& o, auto* rip, BSTR* out) { return o.GetSystemID(rip, out); }, "GUID", "",
          "-GUID {0A1B2C3D-4E5F-6071-8293-A4B5C6D7E8F9}", "{0A1B2C3D-4E5F-6071-8293-A4B5C6D7E8F9}"},
-        {[&](auto& o, auto* rip, BSTR* out) { return o.GetEnvironmentVariable(rip, variable.Get(), out); },
+        {"GetEnvironmentVariable",
+         [&](auto& o, auto* rip, BSTR* out) { return o.GetEnvironmentVariable(rip, variable.Get(), out); },
          "EnvironmentVar", "HOME", "/hd0a", "/hd0a", "/ctrl/DHROOT"},
-        {[](auto& o, auto* rip, BSTR* out) { return o.GetConnectedTavAPIClients(rip, out); }, "ConnectedClients", "",
-         "<Clients/>", "<Clients/>"},
-        {[](auto& o, auto* rip, BSTR* out) { return o.GetVersionName(rip, out); }, "VersionName", "",
+        {"GetConnectedTavAPIClients", [](auto& o, auto* rip, BSTR* out) { return o.GetConnectedTavAPIClients(rip, out); },
+         "ConnectedClients", "", "<Clients/>", "<Clients/>"},
+        {"GetVersionName", [](auto& o, auto* rip, BSTR* out) { return o.GetVersionName(rip, out); }, "VersionName", "",
          "-Name \"7.2\"", "\"7.2\""},
-        {[&](auto& o, auto* rip, BSTR* out) { return o.GetProductVersionName(rip, product.Get(), out); },
+        {"GetProductVersionName",
+         [&](auto& o, auto* rip, BSTR* out) { return o.GetProductVersionName(rip, product.Get(), out); },
          "ProductVersionName", "-Name \"Vision\"", "-Name 3.1", "3.1"},
     };
-    ControllerObject* object = Make();
     for (const Case& c : cases) {
         SCOPED_TRACE(c.args);
-        Component().ClearScript();
+        CallPattern pattern = Reading(c.name, c.call);
+        if (c.command == std::string("VersionInfo")) {
+            pattern.invalidParams += ".";
+        }
+        ExpectCallPattern(pattern);
+        ControllerObject* object = Make();
         Script(c.command, c.reply);
         TestBstr out;
         EXPECT_EQ(c.call(*object, nullptr, out.Out()), S_OK) << ErrorText();
@@ -126,6 +83,32 @@ TEST_F(IdentityCommandsTest, ReadsSendTheirCommandAndDecodeTheReply) {
         EXPECT_EQ(sent.args, c.args);
         EXPECT_EQ(sent.url, c.url);
     }
+}
+
+TEST_F(IdentityCommandsTest, OptionAndEnergyStateFollowTheCallPatternAndAreSent) {
+    TestBstr option("Vision Guidance");
+    CallPattern pattern = Reading("IsOptionPresent", [&](auto& o, auto* rip, BSTR* out) {
+        LONG present = 0;
+        return o.IsOptionPresent(rip, option.Get(), out ? &present : nullptr);
+    });
+    pattern.nullOut = "IsOptionPresent. Invalid out-pointer";
+    ExpectCallPattern(pattern);
+    ExpectCallPattern(Reading("GetEnergyState", [](auto& o, auto* rip, BSTR* out) {
+        TavSysEnergyState state{};
+        return o.GetSysEnergyState(rip, out ? &state : nullptr);
+    }));
+
+    ControllerObject* object = Make();
+    Script("IsOptionPresent", "-OptionPresent 1");
+    LONG present = 0;
+    EXPECT_EQ(object->IsOptionPresent(nullptr, option.Get(), &present), S_OK);
+    EXPECT_EQ(present, 1);
+    EXPECT_EQ(LastCommand().verb + LastCommand().args, "Get-Option \"Vision Guidance\"");
+    Script("SysEnergyState", "-sysenergy resuming");
+    TavSysEnergyState state{};
+    EXPECT_EQ(object->GetSysEnergyState(nullptr, &state), S_OK);
+    EXPECT_EQ(state, TavSysEnergyStateResuming);
+    EXPECT_EQ(LastCommand().verb + LastCommand().command + LastCommand().args, "GetSysEnergyState");
 }
 
 TEST_F(IdentityCommandsTest, VersionInfoThatIsNotTextIsRefused) {
@@ -144,12 +127,21 @@ TEST_F(IdentityCommandsTest, VersionInfoThatIsNotTextIsRefused) {
 // characters (name and identifier) and within Latin-1.
 TEST_F(IdentityCommandsTest, WritesQuoteTheirTextOrRefuseIt) {
     using Set = HRESULT (STDMETHODCALLTYPE ControllerObject::*)(TavInParams*, BSTR);
+    for (auto [set, name] : {std::pair<Set, std::string>{&ControllerObject::SetControllerName, "SetControllerName"},
+                             {&ControllerObject::SetControllerId, "SetControllerId"},
+                             {&ControllerObject::SetLanguage, "SetLanguage"}}) {
+        CallPattern pattern;
+        pattern.call = [set](ControllerObject& o, TavInParams* rip, bool) { return (o.*set)(rip, nullptr); };
+        pattern.invalidParams = name + ": Invalid TavInParams";
+        pattern.beforeInit = "TavController used before Initialized";
+        ExpectCallPattern(pattern);
+    }
     struct Case {
         Set set;
         const char* command;
         std::optional<std::string> value;  // nullopt: a NULL BSTR
         HRESULT hr;
-        const char* argsOrError;
+        const char* argsOrError;  // nullptr: "-Name \"<value>\""
     };
     const std::string n256(256, 'n'), n257(257, 'n');
     const Case cases[] = {
@@ -180,8 +172,7 @@ TEST_F(IdentityCommandsTest, WritesQuoteTheirTextOrRefuseIt) {
         }
         EXPECT_EQ((object->*c.set)(nullptr, value.Get()), c.hr);
         if (SUCCEEDED(c.hr)) {
-            EXPECT_EQ(LastCommand().verb, "Set");
-            EXPECT_EQ(LastCommand().command, c.command);
+            EXPECT_EQ(LastCommand().verb + LastCommand().command, std::string("Set") + c.command);
             EXPECT_EQ(LastCommand().args, c.argsOrError ? c.argsOrError : "-Name \"" + *c.value + "\"");
         } else {
             EXPECT_EQ(CommandCount(), 0u);
@@ -191,13 +182,9 @@ TEST_F(IdentityCommandsTest, WritesQuoteTheirTextOrRefuseIt) {
 }
 
 TEST_F(IdentityCommandsTest, RefusedArgumentsAreReportedBeforeSending) {
-    struct Case {
-        std::function<HRESULT(ControllerObject&, TavInParams*, BSTR*)> call;
-        const char* error;
-    };
     TestBstr empty(""), name("x");
     const auto unknown = static_cast<TavControllerInfo>(2);
-    const Case cases[] = {
+    const std::pair<BstrOp, const char*> cases[] = {
         {[&](auto& o, auto* rip, BSTR* out) { return o.GetVersionInfo(rip, unknown, out); },
          "TavController::GetVersionInfo - Unknown information type"},
         {[&](auto& o, auto* rip, BSTR* out) { return o.GetVersionInfoFromSystem(rip, nullptr, SystemInfo, out); },
@@ -206,40 +193,19 @@ TEST_F(IdentityCommandsTest, RefusedArgumentsAreReportedBeforeSending) {
          "GetVersionInfoFromSystem - Unknown information type"},
         {[&](auto& o, auto* rip, BSTR* out) { return o.GetEnvironmentVariable(rip, empty.Get(), out); },
          "GetEnvironmentVariable: Empty environment variable"},
-        {[&](auto& o, auto* rip, BSTR* out) { return o.GetEnvironmentVariable(rip, nullptr, out); },
-         "GetEnvironmentVariable: Empty environment variable"},
         {[&](auto& o, auto* rip, BSTR* out) { return o.GetProductVersionName(rip, nullptr, out); },
          "GetProductVersionName: Invalid product name"},
     };
     ControllerObject* object = Make();
-    for (const Case& c : cases) {
-        SCOPED_TRACE(c.error);
+    for (const auto& [call, error] : cases) {
+        SCOPED_TRACE(error);
         TavInParams rip = SyncCall(3);
         TestBstr out;
-        EXPECT_EQ(c.call(*object, &rip, out.Out()), E_INVALIDARG);
-        EXPECT_TRUE(HasError(c.error));
+        EXPECT_EQ(call(*object, &rip, out.Out()), E_INVALIDARG);
+        EXPECT_TRUE(HasError(error));
         EXPECT_EQ(Callback().Last().status, E_INVALIDARG) << "the callback was not told";
     }
     EXPECT_EQ(CommandCount(), 0u);
-}
-
-TEST_F(IdentityCommandsTest, OptionAndEnergyStateAreSentAndDecoded) {
-    ControllerObject* object = Make();
-    TestBstr option("Vision Guidance");
-    Script("IsOptionPresent", "-OptionPresent 1");
-    LONG present = 0;
-    EXPECT_EQ(object->IsOptionPresent(nullptr, option.Get(), &present), S_OK);
-    EXPECT_EQ(present, 1);
-    EXPECT_EQ(LastCommand().verb, "Get");
-    EXPECT_EQ(LastCommand().args, "-Option \"Vision Guidance\"");
-
-    Script("SysEnergyState", "-sysenergy resuming");
-    TavSysEnergyState state{};
-    EXPECT_EQ(object->GetSysEnergyState(nullptr, &state), S_OK);
-    EXPECT_EQ(state, TavSysEnergyStateResuming);
-    EXPECT_EQ(LastCommand().verb, "Get");
-    EXPECT_EQ(LastCommand().command, "SysEnergyState");
-    EXPECT_EQ(LastCommand().args, "");
 }
 
 }  // namespace

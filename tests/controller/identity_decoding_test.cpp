@@ -1,6 +1,7 @@
 // The Unpack operations of identity, names and version information: their
 // checks in order with their own texts, and each reply grammar.
 #include <functional>
+#include <tuple>
 
 #include "support/controller_test.h"
 
@@ -72,43 +73,31 @@ TEST_F(IdentityDecodingTest, ChecksRunInOrderWithEachOperationsTexts) {
     }
 }
 
-TEST_F(IdentityDecodingTest, TextRepliesDecode) {
+// The Sync reads show the plain replies; these are the edges of each grammar.
+TEST_F(IdentityDecodingTest, TextRepliesDecodeAtTheirEdges) {
     struct Case {
         BstrUnpack unpack;
         std::string reply;
         HRESULT hr;
         std::string decodedOrError;
     };
-    const std::string guid = "{0A1B2C3D-4E5F-6071-8293-A4B5C6D7E8F9}";
     const std::string badGuid = "UnpackSystemID - Bad GUID format";
     const Case cases[] = {
-        {&ControllerObject::UnpackControllerName, "-Name \"Cell 4\" -More", S_OK, "Cell 4"},
         {&ControllerObject::UnpackControllerName, "-Name \"\"", S_OK, ""},
         {&ControllerObject::UnpackControllerName, "-Name \"" + std::string(300, 'c') + "\"", S_OK,
          std::string(256, 'c')},
         {&ControllerObject::UnpackControllerName, "-Name Cell", E_FAIL, "UnpackControllerName failed."},
-        {&ControllerObject::UnpackControllerName, "-Name \"", E_FAIL, "UnpackControllerName failed."},
-        {&ControllerObject::UnpackControllerID, "-ID \"42-A\"", S_OK, "42-A"},
         {&ControllerObject::UnpackControllerID, "-ID \"\"", S_OK, ""},
         {&ControllerObject::UnpackControllerID, "-Id \"42\"", E_FAIL, "UnpackControllerID failed."},
-        {&ControllerObject::UnpackSystemID, "-GUID " + guid + " -Rest {x}", S_OK, guid},
         {&ControllerObject::UnpackSystemID, "{0A1B2C3D-4E5F-6071-8293-A4B5C6D7E8F}", E_FAIL, badGuid},
         {&ControllerObject::UnpackSystemID, "{0A1B2C3D-4E5F-6071-8293-A4B5C6D7E8F9A}", E_FAIL, badGuid},
         {&ControllerObject::UnpackSystemID, "0A1B2C3D-4E5F-6071-8293-A4B5C6D7E8F9}", E_FAIL, badGuid},
         {&ControllerObject::UnpackSystemID, "{0A1B2C3D-4E5F-6071-8293-A4B5C6D7E8F9", E_FAIL, badGuid},
-        {&ControllerObject::UnpackSystemID, "{0A1B2C3D-4E5F-6071-8293-A4B5C6D7E8FG}", E_FAIL,
-         "UnpackSystemID - Invalid GUID"},
         {&ControllerObject::UnpackSystemID, "{0A1B2C3D+4E5F-6071-8293-A4B5C6D7E8F9}", E_FAIL,
          "UnpackSystemID - Invalid GUID"},
-        {&ControllerObject::UnpackVersionName, "-Name 7.2 \"beta\" ", S_OK, "7.2 \"beta\" "},
         {&ControllerObject::UnpackVersionName, "-Name ", S_OK, ""},
         {&ControllerObject::UnpackVersionName, "-Name", E_FAIL, "UnpackVersionName. Bad format."},
-        {&ControllerObject::UnpackVersionName, "-name 7.2", E_FAIL, "UnpackVersionName. Bad format."},
-        {&ControllerObject::UnpackProductVersionName, "-Name 3.1", S_OK, "3.1"},
-        {&ControllerObject::UnpackProductVersionName, "-Nome 3.1", E_FAIL, "UnpackProductVersionName. Bad format."},
-        {&ControllerObject::UnpackVersionInfo, " any text ", S_OK, " any text "},
-        {&ControllerObject::UnpackEnvironmentVariable, "-x \"y\"", S_OK, "-x \"y\""},
-        {&ControllerObject::UnpackConnectedTavAPIClients, "<Clients><C/></Clients>", S_OK, "<Clients><C/></Clients>"},
+        {&ControllerObject::UnpackProductVersionName, "-name 3.1", E_FAIL, "UnpackProductVersionName. Bad format."},
     };
     ControllerObject* object = Make();
     for (const Case& c : cases) {
@@ -118,9 +107,9 @@ TEST_F(IdentityDecodingTest, TextRepliesDecode) {
         BSTR out = stale.Get();
         EXPECT_EQ((object->*c.unpack)(data.Get(), &out), c.hr);
         if (SUCCEEDED(c.hr)) {
-            TestBstr decoded(OleStringView(out, SysStringLen(out)));
+            ASSERT_NE(out, nullptr);
+            EXPECT_EQ(Narrow(OleStringView(out, SysStringLen(out))), c.decodedOrError);
             SysFreeString(out);
-            EXPECT_EQ(decoded.Text(), c.decodedOrError);
         } else {
             EXPECT_EQ(out, nullptr) << "a failed decoding left a string";
             EXPECT_TRUE(HasError(c.decodedOrError));
@@ -129,40 +118,27 @@ TEST_F(IdentityDecodingTest, TextRepliesDecode) {
 }
 
 TEST_F(IdentityDecodingTest, EnergyStateWordsIgnoreCase) {
-    const std::pair<const char*, TavSysEnergyState> words[] = {
-        {"-sysenergy notpaused", TavSysEnergyStateNotPaused}, {"-sysenergy PAUSED", TavSysEnergyStatePaused},
-        {"-sysenergy Blocked", TavSysEnergyStateBlocked},     {"-sysenergy resuming", TavSysEnergyStateResuming},
-        {"-sysenergy pausing x", TavSysEnergyStatePausing},
-    };
-    const std::pair<const char*, const char*> refused[] = {
-        {"-sysenergy sleeping", "UnpackEnergyState. Unsupported value."},
-        {"-sysenergy pausedandmore", "UnpackEnergyState. Unsupported value."},
-        {"-sysenergy ", "UnpackEnergyState. Unsupported format."},
-        {"-energy paused", "UnpackEnergyState. Unsupported format."},
+    const std::tuple<const char*, HRESULT, TavSysEnergyState, const char*> cases[] = {
+        {"-sysenergy notpaused", S_OK, TavSysEnergyStateNotPaused, ""},
+        {"-sysenergy PAUSED", S_OK, TavSysEnergyStatePaused, ""},
+        {"-sysenergy Blocked", S_OK, TavSysEnergyStateBlocked, ""},
+        {"-sysenergy pausing x", S_OK, TavSysEnergyStatePausing, ""},
+        {"-sysenergy pausedandmore", E_FAIL, {}, "UnpackEnergyState. Unsupported value."},
+        {"-sysenergy ", E_FAIL, {}, "UnpackEnergyState. Unsupported format."},
     };
     ControllerObject* object = Make();
-    for (const auto& [reply, expected] : words) {
+    for (const auto& [reply, hr, expected, error] : cases) {
         TestVariant data = TestVariant::Text(reply);
         TavSysEnergyState state{};
-        EXPECT_EQ(object->UnpackSysEnergyState(data.Get(), &state), S_OK) << reply;
-        EXPECT_EQ(state, expected) << reply;
-    }
-    for (const auto& [reply, error] : refused) {
-        TestVariant data = TestVariant::Text(reply);
-        TavSysEnergyState state{};
-        EXPECT_EQ(object->UnpackSysEnergyState(data.Get(), &state), E_FAIL) << reply;
-        EXPECT_TRUE(HasError(error)) << reply;
+        EXPECT_EQ(object->UnpackSysEnergyState(data.Get(), &state), hr) << reply;
+        EXPECT_TRUE(SUCCEEDED(hr) ? state == expected : HasError(error)) << reply;
     }
 }
 
 TEST_F(IdentityDecodingTest, OptionPresenceQuotesABadReply) {
     ControllerObject* object = Make();
-    TestVariant no = TestVariant::Text("-OptionPresent 0");
     TestVariant bad = TestVariant::Text("-OptionPresent yes");
     LONG present = 7;
-    EXPECT_EQ(object->UnpackIsOptionPresent(no.Get(), &present), S_OK);
-    EXPECT_EQ(present, 0);
-    present = 7;
     EXPECT_EQ(object->UnpackIsOptionPresent(bad.Get(), &present), E_FAIL);
     EXPECT_TRUE(HasError("UnpackIsOptionPresent. Bad result string: -OptionPresent yes"));
     EXPECT_EQ(present, 7) << "the value is scanned in place, not cleared first";
