@@ -52,24 +52,6 @@ TEST(Enumerator, FilterStepsOverStringsThatDoNotPass) {
     EXPECT_EQ((Texts{"12", "a1", "", "x"}), Fetch(strings).texts);
 }
 
-TEST(Enumerator, RecordsKeepTheirOrderAndGetTheirOwnStrings) {
-    TavStorageDevice* devices = AllocateArray<TavStorageDevice>(2);
-    devices[0] = {SysAllocString(OLESTR("/hd0a")), TavStorageDeviceType{}, 1, 0};
-    devices[1] = {SysAllocString(OLESTR("/bd0")), TavStorageDeviceType{}, 0, 1};
-    ComPtr<IEnumStorageDevices> list;
-    ASSERT_EQ(S_OK, MakeEnumerator<StorageDeviceTraits>(devices, devices + 2, nullptr, EnumOwnership::Take, &list));
-    EXPECT_EQ(S_OK, list->Sort(1));
-    EXPECT_EQ(S_OK, list->Filter(2));
-    TavStorageDevice out[2] = {};
-    ULONG got = 0;
-    ASSERT_EQ(S_OK, list->RemNext(2, out, &got));
-    EXPECT_EQ("/hd0a", Narrow(out[0].deviceName));
-    EXPECT_NE(devices[0].deviceName, out[0].deviceName);
-    EXPECT_EQ(1, out[1].bReadOnly);
-    StorageDeviceTraits::Free(out[0]);
-    StorageDeviceTraits::Free(out[1]);
-}
-
 TEST(Enumerator, CloneCopiesFromThePositionWithTheFilterOff) {
     const LONG locksBefore = ModuleLock::Count();
     {
@@ -97,14 +79,21 @@ struct CountedOwner : IUnknown {
     ULONG references = 0;
 };
 
-TEST(Enumerator, BorrowedArrayStaysWithItsOwnerAndClonesHoldThatOwner) {
+TEST(Enumerator, RecordListsIgnoreSortAndFilterAndClonesHoldTheOwner) {
     CountedOwner owner;
     TavPSCUnit units[2] = {{1, 2, S_OK}, {3, 4, E_FAIL}};
     ComPtr<IEnumTavPSCUnits> borrowed;
     ASSERT_EQ(S_OK, MakeEnumerator<PscUnitTraits>(units, units + 2, &owner, EnumOwnership::Borrow, &borrowed));
+    EXPECT_EQ(S_OK, borrowed->Sort(4));
+    EXPECT_EQ(S_OK, borrowed->Filter(2));
+    TavPSCUnit out[2] = {};
+    ULONG got = 0;
+    ASSERT_EQ(S_OK, borrowed->RemNext(2, out, &got));
+    EXPECT_EQ(1u, out[0].PSCUnitID);
+    EXPECT_EQ(E_FAIL, out[1].PSCCallStatus);
     ComPtr<IEnumTavPSCUnits> clone;
     ASSERT_EQ(S_OK, borrowed->Clone(&clone));
-    EXPECT_EQ(2u, owner.references);
+    EXPECT_EQ(2u, owner.references);  // a clone of a borrowed list holds the list's owner
     clone = nullptr;
     borrowed = nullptr;
     EXPECT_EQ(0u, owner.references);
