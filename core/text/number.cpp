@@ -9,13 +9,19 @@ namespace detail {
 
 Magnitude ReadDigits(const OLECHAR* first, const OLECHAR* last) noexcept {
     constexpr std::uint64_t kMax = std::numeric_limits<std::uint64_t>::max();
+    // Nineteen digits always fit, so most numbers need no overflow check.
+    constexpr std::ptrdiff_t kAlwaysFits = 19;
     Magnitude m;
+    const OLECHAR* const safeEnd = last - first > kAlwaysFits ? first + kAlwaysFits : last;
+    for (; first != safeEnd && IsDigit(*first); ++first) {
+        m.value = m.value * 10 + static_cast<std::uint64_t>(*first - u'0');
+    }
     for (; first != last && IsDigit(*first); ++first) {
         const auto digit = static_cast<std::uint64_t>(*first - u'0');
-        if (m.value > (kMax - digit) / 10) {
+        if (m.overflow || m.value > (kMax - digit) / 10) {
             m.overflow = true;
             m.value = kMax;
-        } else if (!m.overflow) {
+        } else {
             m.value = m.value * 10 + digit;
         }
     }

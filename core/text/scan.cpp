@@ -30,38 +30,43 @@ bool IsFloatConversion(OLECHAR c) noexcept {
     return c == u'f' || c == u'e' || c == u'g' || c == u'F' || c == u'E' || c == u'G';
 }
 
+// The format ends at its end or at a NUL, found where it is reached.
+bool More(const OLECHAR* f, const OLECHAR* last) noexcept {
+    return f != last && *f != 0;
+}
+
 // Reads "%[*][width][l]conversion" from just after the '%'.
 Directive ParseDirective(const OLECHAR*& f, const OLECHAR* last) noexcept {
     Directive d;
-    if (f != last && *f == u'*') {
+    if (More(f, last) && *f == u'*') {
         d.suppress = true;
         ++f;
     }
-    for (; f != last && IsDigit(*f); ++f) {
+    for (; More(f, last) && IsDigit(*f); ++f) {
         d.width = std::min(d.width * 10 + static_cast<std::size_t>(*f - u'0'), kUnboundedWidth);
     }
-    if (f != last && *f == u'l') {
+    if (More(f, last) && *f == u'l') {
         d.longSize = true;
         ++f;
     }
-    if (f == last) {
+    if (!More(f, last)) {
         return d;
     }
     d.conversion = *f++;
     switch (d.conversion) {
     case u'[': {
-        if (f != last && *f == u'^') {
+        if (More(f, last) && *f == u'^') {
             d.setNegated = true;
             ++f;
         }
         const OLECHAR* const first = f;
-        if (f != last && (*f == u']' || *f == u'-')) {
+        if (More(f, last) && (*f == u']' || *f == u'-')) {
             ++f;
         }
-        while (f != last && *f != u']') {
+        while (More(f, last) && *f != u']') {
             ++f;
         }
-        if (f == last) {
+        if (!More(f, last)) {
             return d;
         }
         d.setMembers = OleStringView(first, static_cast<std::size_t>(f - first));
@@ -115,7 +120,7 @@ bool TargetKindOf(const Directive& d, ScanTargetKind& kind) noexcept {
 // that a wrong call shows on its first run, not only with a complete reply.
 void AssertTargetsMatch(const OLECHAR* f, const OLECHAR* last, std::span<const ScanTarget> targets) noexcept {
     std::size_t next = 0;
-    while (f != last) {
+    while (More(f, last)) {
         if (*f++ != u'%') {
             continue;
         }
@@ -142,7 +147,7 @@ public:
 
     int Run(const OLECHAR* f, const OLECHAR* const last) noexcept {
         bool skipSpace = false;
-        while (f != last) {
+        while (More(f, last)) {
             const OLECHAR fc = *f++;
             if (fc != u'%') {
                 if (IsSpace(fc)) {
@@ -363,7 +368,6 @@ private:
 }  // namespace
 
 int ScanTargets(OleStringView input, OleStringView format, std::span<const ScanTarget> targets) noexcept {
-    format = UpToNul(format);
     const OLECHAR* const f = format.data();
     const OLECHAR* const last = f + format.size();
 #ifndef NDEBUG
