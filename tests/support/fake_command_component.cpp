@@ -173,6 +173,28 @@ void FakeCommandComponent::DropIpcSink() {
     }
 }
 
+HRESULT FakeCommandComponent::DeliverIpcMessage(TavIPCHeaderInternal header, std::vector<BYTE> data) {
+    IUnknown* sink;
+    {
+        std::lock_guard<std::mutex> hold(lock_);
+        sink = ipcSink_;
+        if (sink != nullptr) {
+            sink->AddRef();
+        }
+    }
+    if (sink == nullptr) {
+        return E_NOINTERFACE;
+    }
+    _ITavIPCMessages* messages = nullptr;
+    HRESULT hr = sink->QueryInterface(IID__ITavIPCMessages, reinterpret_cast<void**>(&messages));
+    sink->Release();
+    if (SUCCEEDED(hr)) {
+        hr = messages->OnMessage(&header, data.empty() ? nullptr : data.data(), static_cast<LONG>(data.size()));
+        messages->Release();
+    }
+    return hr;
+}
+
 void FakeCommandComponent::ClearRecords() {
     std::lock_guard<std::mutex> hold(lock_);
     commands_.clear();
@@ -290,7 +312,9 @@ HRESULT FakeCommandComponent::Subscribe(TavInParams* rip, TavEventParams* params
                                         BSTR eventArgs, LONG kind, ULONG* cookie) {
     RecordedSubscription recorded;
     recorded.params = Capture(rip);
-    recorded.eventParams = *params;
+    if (params != nullptr) {
+        recorded.eventParams = *params;
+    }
     recorded.helper = helper;
     recorded.eventName = Narrow(eventName);
     if (eventArgs != nullptr) {
@@ -299,7 +323,7 @@ HRESULT FakeCommandComponent::Subscribe(TavInParams* rip, TavEventParams* params
     recorded.kind = kind;
     std::lock_guard<std::mutex> hold(lock_);
     const HRESULT failure = FailureFor(ComOperation::Subscribe);
-    if (SUCCEEDED(failure)) {
+    if (SUCCEEDED(failure) && cookie != nullptr) {
         recorded.cookie = *cookie = nextCookie_++;
     }
     subscriptions_.push_back(std::move(recorded));
@@ -309,11 +333,13 @@ HRESULT FakeCommandComponent::Subscribe(TavInParams* rip, TavEventParams* params
 HRESULT FakeCommandComponent::SubscribeConnectionEvents(TavInParams* rip, TavEventParams* params, ULONG* cookie) {
     RecordedSubscription recorded;
     recorded.params = Capture(rip);
-    recorded.eventParams = *params;
+    if (params != nullptr) {
+        recorded.eventParams = *params;
+    }
     recorded.connectionEvents = true;
     std::lock_guard<std::mutex> hold(lock_);
     const HRESULT failure = FailureFor(ComOperation::SubscribeConnectionEvents);
-    if (SUCCEEDED(failure)) {
+    if (SUCCEEDED(failure) && cookie != nullptr) {
         recorded.cookie = *cookie = nextCookie_++;
     }
     subscriptions_.push_back(std::move(recorded));

@@ -157,6 +157,9 @@ public:
     // The sink given to ConnectIPCSink (a reference is held until DropIpcSink).
     IUnknown* IpcSink() const;
     void DropIpcSink();
+    // Hands a message to that sink as the controller would; E_NOINTERFACE
+    // without a sink that answers _ITavIPCMessages.
+    HRESULT DeliverIpcMessage(TavIPCHeaderInternal header, std::vector<BYTE> data);
     void ClearRecords();
 
     // Waits until every Async reply handed out so far has been delivered.
