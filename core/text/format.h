@@ -15,7 +15,8 @@
 // 32-bit target, d and i format the argument as a 32-bit signed value and
 // u x X as a 32-bit unsigned one, with or without l; ll formats 64 bits.
 // So "%.4d" with 7 gives "0007", with -7 "-0007"; "%.38s" cuts a text at 38
-// characters; a null string argument prints "(null)".
+// characters; a null string argument prints "(null)", or nothing when a
+// precision below 6 would cut that, as glibc does.
 //
 // Arguments: any integer or enumeration (for d i u x X c), and for s:
 // const OLECHAR* / BSTR, OleStringView, OleString, or narrow UTF-8 text

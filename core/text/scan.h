@@ -22,7 +22,9 @@
 // low 32 bits are stored. So "-1" read by %u gives 4294967295 and
 // "4294967296" read by %d gives 0, on every platform.
 // Doubles: a decimal number with optional fraction and exponent, "inf",
-// "infinity" or "nan", correctly rounded; hexadecimal forms are not read.
+// "infinity" or "nan", correctly rounded as strtod does; hexadecimal forms
+// are not read. As with glibc the field takes a dangling exponent along:
+// "1e," gives 1.0 and %n counts the 'e'.
 //
 // Targets, one per storing directive, in order:
 //   %d %u %n    pointer to any 4-byte integer (int32_t, uint32_t, LONG, ...)
@@ -31,7 +33,7 @@
 //   %s %[...]   std::span<OLECHAR> or an OLECHAR array: the capacity counts
 //               the terminator; a field that does not fit is a matching
 //               failure (nothing is stored, the field does not count and
-//               scanning stops), so a width is never a buffer guarantee.
+//               scanning stops): the span, not the width, bounds the write.
 // A directive whose target is missing or of another kind is a programming
 // error: it asserts in debug builds and is a matching failure otherwise.
 //
