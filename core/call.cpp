@@ -89,7 +89,9 @@ SentCommand Call::SendTo(BSTR url, Verb verb, OleStringView command, OleStringVi
     Bstr commandText(command);
     Bstr argsText(args);
     if (verbText.IsNull() || commandText.IsNull() || argsText.IsNull()) {
-        sent.hr_ = Fail(E_OUTOFMEMORY, OLESTR("SysAllocString failed"), where);
+        // A command that could not be built reports from here, apart from one
+        // that could not be delivered.
+        sent.hr_ = Fail(E_OUTOFMEMORY, OLESTR("SysAllocString failed"));
         return sent;
     }
     ITavComCtrl* component = object_.CommandComponent();

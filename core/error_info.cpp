@@ -75,7 +75,7 @@ HRESULT ErrorInfo::SetFromReply(const TavCommandReply& reply, ErrorSite site) {
 HRESULT ErrorInfo::CopyTo(BSTR* out) const {
     CriticalSectionLock hold(lock_);
     *out = text_ == nullptr ? nullptr : SysAllocStringLen(text_, SysStringLen(text_));
-    return S_OK;
+    return text_ != nullptr && *out == nullptr ? E_OUTOFMEMORY : S_OK;
 }
 
 HRESULT ErrorInfo::SetFromVariant(const VARIANT* data) {
