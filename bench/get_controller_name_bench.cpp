@@ -1,0 +1,221 @@
+// A Sync GetControllerName as a client makes it, through the module and the
+// virtual controller registered in-process, against a floor: the work that
+// any implementation of that call has to do, in a plain loop. The table
+// printed at the end gives the call's time as a multiple of the floor's.
+#include <benchmark/benchmark.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <iostream>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "TavController.h"
+#include "core/text/format.h"
+#include "core/text/scan.h"
+#include "module/server_exports.h"
+#include "sim/virtual_controller.h"
+#include "tav/bstr.h"
+#include "tav/com_ptr.h"
+#include "tav/variant.h"
+
+namespace {
+
+using tav::Bstr;
+using tav::ComPtr;
+using tav::OleString;
+using tav::OleStringView;
+
+// As long as a name gets on a real cell, well under the 256 the controller keeps.
+constexpr OleStringView kName = OLESTR("Robot cell 1 of the east wing");
+
+// The process as a client sets it up: COM, the virtual controller registered
+// in-process, and a controller object from the module's class object,
+// initialised with the virtual controller's URL and named kName.
+class Client {
+public:
+    Client() {
+        comInitialised_ = SUCCEEDED(CoInitializeEx(nullptr, COINIT_MULTITHREADED));
+        simulator_ = tav::sim::RegisterInProcess();
+        if (!simulator_) {
+            failure_ = "cannot register the virtual controller";
+            return;
+        }
+        ComPtr<IClassFactory> factory;
+        if (FAILED(DllGetClassObject(CLSID_TavController, IID_IClassFactory, reinterpret_cast<void**>(&factory))) ||
+            FAILED(factory->CreateInstance(nullptr, IID_ITavController, reinterpret_cast<void**>(&controller_)))) {
+            failure_ = "cannot create a TavController object";
+            return;
+        }
+        const Bstr url(tav::sim::kDefaultUrl);
+        const Bstr name(kName);
+        TavInParams sync{};
+        sync.callType = Sync;
+        if (FAILED(controller_->Init(url.Get())) || FAILED(controller_->SetControllerName(&sync, name.Get()))) {
+            failure_ = "cannot initialise and name the controller";
+            controller_ = nullptr;
+        }
+    }
+
+    ~Client() {
+        controller_ = nullptr;
+        simulator_.Revoke();
+        if (comInitialised_) {
+            CoUninitialize();
+        }
+    }
+
+    ITavController* Controller() const { return controller_.Get(); }
+    const char* Failure() const { return failure_; }
+
+private:
+    bool comInitialised_ = false;
+    tav::sim::InProcessRegistration simulator_;
+    ComPtr<ITavController> controller_;
+    const char* failure_ = nullptr;
+};
+
+Client* TheClient = nullptr;
+
+OleString NameFromCall() {
+    TavInParams sync{};
+    sync.callType = Sync;
+    Bstr name;
+    if (FAILED(TheClient->Controller()->GetControllerName(&sync, name.Receive()))) {
+        return OLESTR("(failed)");
+    }
+    return OleString(name.View());
+}
+
+void Call(benchmark::State& state) {
+    if (TheClient->Failure() != nullptr) {
+        state.SkipWithError(TheClient->Failure());
+        return;
+    }
+    if (NameFromCall() != kName) {
+        state.SkipWithError("GetControllerName does not answer the name that was set");
+        return;
+    }
+    ITavController* controller = TheClient->Controller();
+    TavInParams sync{};
+    sync.callType = Sync;
+    for (auto _ : state) {
+        BSTR name = nullptr;
+        benchmark::DoNotOptimize(controller->GetControllerName(&sync, &name));
+        benchmark::DoNotOptimize(name);
+        SysFreeString(name);
+    }
+}
+
+// One call's unavoidable work: the command's three strings as Execute takes
+// them (a Get of CtrlName has no arguments to format), the reply text as the
+// controller formats it from the name it keeps, in the BSTR of the reply's
+// VARIANT, the scan of the quoted name out of it, and the caller's BSTR,
+// returned as the call returns it (NULL when the scan fails).
+BSTR FloorName() {
+    const Bstr verb(OLESTR("Get"));
+    const Bstr command(OLESTR("CtrlName"));
+    const Bstr args(OLESTR(""));
+    benchmark::DoNotOptimize(verb.Get());
+    benchmark::DoNotOptimize(command.Get());
+    benchmark::DoNotOptimize(args.Get());
+
+    tav::Variant reply;
+    reply.SetBstr(Bstr(tav::text::Format(OLESTR("-Name \"%s\""), kName)));
+    const BSTR replyText = reply.Get()->bstrVal;
+    benchmark::DoNotOptimize(replyText);
+
+    OLECHAR field[257];
+    if (tav::text::Scan(OleStringView(replyText, SysStringLen(replyText)), OLESTR("-Name \"%256[^\"]"), field) != 1) {
+        return nullptr;
+    }
+    return SysAllocString(field);
+}
+
+void Floor(benchmark::State& state) {
+    Bstr check;
+    check.Attach(FloorName());
+    if (check.View() != kName) {
+        state.SkipWithError("the floor does not produce the name");
+        return;
+    }
+    for (auto _ : state) {
+        BSTR name = FloorName();
+        benchmark::DoNotOptimize(name);
+        SysFreeString(name);
+    }
+}
+
+// The usual console output, then the call's CPU time as a multiple of the
+// floor's: the median of the repetitions when there are several.
+class RatioReporter : public benchmark::ConsoleReporter {
+public:
+    // Plain text, so that the figures can be pasted as they are.
+    RatioReporter() : ConsoleReporter(OO_Tabular) {}
+
+    void ReportRuns(const std::vector<Run>& runs) override {
+        ConsoleReporter::ReportRuns(runs);
+        for (const Run& run : runs) {
+            if (run.error_occurred) {
+                continue;
+            }
+            Timings& timings = timings_[run.run_name.function_name];
+            if (run.run_type == Run::RT_Iteration) {
+                timings.repetitions.push_back(run.GetAdjustedCPUTime());
+            } else if (run.aggregate_name == "median") {
+                timings.median = run.GetAdjustedCPUTime();
+            }
+        }
+    }
+
+    void Finalize() override {
+        ConsoleReporter::Finalize();
+        const double call = Median("GetControllerName/call");
+        const double floor = Median("GetControllerName/floor");
+        if (call <= 0 || floor <= 0) {
+            return;
+        }
+        char line[160];
+        std::snprintf(line, sizeof line,
+                      "\nSync GetControllerName / its floor, CPU time, same process: %.2f (%.0f ns / %.0f ns)\n",
+                      call / floor, call, floor);
+        GetOutputStream() << line;
+    }
+
+private:
+    struct Timings {
+        std::vector<double> repetitions;
+        double median = 0;
+    };
+
+    double Median(const std::string& name) {
+        Timings& timings = timings_[name];
+        if (timings.median > 0 || timings.repetitions.empty()) {
+            return timings.median;
+        }
+        std::vector<double>& all = timings.repetitions;
+        std::nth_element(all.begin(), all.begin() + all.size() / 2, all.end());
+        return all[all.size() / 2];
+    }
+
+    std::map<std::string, Timings> timings_;
+};
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
+        return 1;
+    }
+    Client client;
+    TheClient = &client;
+    benchmark::RegisterBenchmark("GetControllerName/call", Call);
+    benchmark::RegisterBenchmark("GetControllerName/floor", Floor);
+    RatioReporter reporter;
+    benchmark::RunSpecifiedBenchmarks(&reporter);
+    benchmark::Shutdown();
+    TheClient = nullptr;
+    return 0;
+}
