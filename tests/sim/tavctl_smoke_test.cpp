@@ -25,7 +25,8 @@ ToolRun RunTool(const std::filesystem::path& tool, const std::string& arguments)
     const std::string command = "\"" + tool.string() + "\" " + arguments + " 2>&1";
     ToolRun run;
 #ifdef _WIN32
-    FILE* pipe = _popen(command.c_str(), "r");
+    // cmd /c drops the first and the last quote of its line: give it a pair.
+    FILE* pipe = _popen(("\"" + command + "\"").c_str(), "r");
 #else
     FILE* pipe = popen(command.c_str(), "r");
 #endif
