@@ -25,7 +25,8 @@ HRESULT Fill(TavCommandReply& record, const Reply& reply, ULONG userDef) {
     VariantInit(&record.data);
     if (reply.hasText) {
         Variant data;
-        if (FAILED(data.SetString(FAILED(reply.status) ? ErrorText(reply.text) : reply.text))) {
+        const HRESULT hr = FAILED(reply.status) ? data.SetString(ErrorText(reply.text)) : data.SetString(reply.text);
+        if (FAILED(hr)) {
             return E_OUTOFMEMORY;
         }
         record.data = data.Detach();
@@ -168,43 +169,43 @@ HRESULT CommandComponent::ExecuteEx(TavInParams* rip, TavCommandReply* reply, Ta
     });
 }
 
+// The success path makes no copies and no texts: a Sync call reads the
+// caller's strings where they are.
 HRESULT CommandComponent::Carry(TavInParams* rip, TavCommandReply* reply, TextView verb, BSTR url, BSTR command,
                                 BSTR args, TextView operation) {
-    const Text where = Text(kComponent) + Text(operation);
+    auto where = [operation] { return Text(kComponent) + Text(operation); };
     if (reply == nullptr) {
-        return Fail(E_POINTER, where + OLESTR(": no reply record"));
+        return Fail(E_POINTER, where() + OLESTR(": no reply record"));
     }
-    const Text urlText(ViewOf(url));
-    const auto controller = Reach(urlText);
+    const Command request{verb, ViewOf(command), ViewOf(args), ViewOf(url)};
+    const auto controller = Reach(request.url);
     if (!controller) {
-        return Fail(E_INVALIDARG, where + OLESTR(": no controller at URL ") + Quoted(urlText));
+        return Fail(E_INVALIDARG, where() + OLESTR(": no controller at URL ") + Quoted(request.url));
     }
     if (auto down = controller->Faults().Transport()) {
         return Fail(down->status, std::move(down->text));
     }
-    const Text verbText(verb);
-    const Text nameText(ViewOf(command));
-    const Text argsText(ViewOf(args));
     const ULONG timeOut = rip == nullptr ? 0 : rip->timeOut;
 
     if (rip == nullptr || rip->callType == Sync) {
-        const auto result = RunCommand(*controller, Command{verbText, nameText, argsText, urlText}, timeOut,
-                                       [](std::chrono::milliseconds delay) {
-                                           std::this_thread::sleep_for(delay);
-                                           return true;
-                                       });
+        const auto result = RunCommand(*controller, request, timeOut, [](std::chrono::milliseconds delay) {
+            std::this_thread::sleep_for(delay);
+            return true;
+        });
         if (FAILED(Fill(*reply, *result, rip == nullptr ? 0 : rip->userDef))) {
-            return Fail(E_OUTOFMEMORY, where + OLESTR(": no memory for the reply"));
+            return Fail(E_OUTOFMEMORY, where() + OLESTR(": no memory for the reply"));
         }
         return S_OK;
     }
 
     const ComPtr<ITavCommandCallback> callback = CallbackOf(*rip);
     if (rip->pCallback != nullptr && !callback) {
-        return Fail(E_NOINTERFACE, where + OLESTR(": the callback is no ITavCommandCallback"));
+        return Fail(E_NOINTERFACE, where() + OLESTR(": the callback is no ITavCommandCallback"));
     }
     const ULONG userDef = rip->userDef;
-    const bool posted = replies_.Post([=](const TaskQueue::Context& context) {
+    const bool posted = replies_.Post([controller, callback, userDef, timeOut, verbText = Text(request.verb),
+                                       nameText = Text(request.name), argsText = Text(request.args),
+                                       urlText = Text(request.url)](const TaskQueue::Context& context) {
         Guarded([&] {
             const auto result = RunCommand(*controller, Command{verbText, nameText, argsText, urlText}, timeOut,
                                            [&context](std::chrono::milliseconds delay) { return context.Sleep(delay); });
@@ -220,7 +221,7 @@ HRESULT CommandComponent::Carry(TavInParams* rip, TavCommandReply* reply, TextVi
         });
     });
     if (!posted) {
-        return Fail(E_UNEXPECTED, where + OLESTR(": the component is shutting down"));
+        return Fail(E_UNEXPECTED, where() + OLESTR(": the component is shutting down"));
     }
     return S_OK;
 }

@@ -2,6 +2,8 @@
 
 namespace tav::sim {
 
+void FaultSwitches::Rearm() { armed_ = !delays_.empty() || !commandFailures_.empty(); }
+
 void FaultSwitches::SetDelay(TextView command, std::chrono::milliseconds delay) {
     std::lock_guard lock(mutex_);
     if (delay.count() <= 0) {
@@ -9,9 +11,13 @@ void FaultSwitches::SetDelay(TextView command, std::chrono::milliseconds delay) 
     } else {
         delays_[Text(command)] = delay;
     }
+    Rearm();
 }
 
 std::chrono::milliseconds FaultSwitches::DelayFor(TextView command) const {
+    if (!armed_) {
+        return std::chrono::milliseconds(0);
+    }
     std::lock_guard lock(mutex_);
     auto found = delays_.find(command);
     if (found == delays_.end()) {
@@ -26,6 +32,7 @@ void FaultSwitches::FailTransport(HRESULT hr, TextView text) {
         std::lock_guard lock(mutex_);
         const bool wasUp = !transport_.has_value();
         transport_ = Failure{hr, text.empty() ? Text(OLESTR("TavComCtrl: connection to the controller lost")) : Text(text)};
+        transportFailing_ = true;
         if (wasUp) {
             listener = transportListener_;
         }
@@ -43,6 +50,7 @@ void FaultSwitches::RestoreTransport() {
             listener = transportListener_;
         }
         transport_.reset();
+        transportFailing_ = false;
     }
     if (listener) {
         listener(true);
@@ -50,6 +58,9 @@ void FaultSwitches::RestoreTransport() {
 }
 
 std::optional<Failure> FaultSwitches::Transport() const {
+    if (!transportFailing_) {
+        return std::nullopt;
+    }
     std::lock_guard lock(mutex_);
     return transport_;
 }
@@ -58,14 +69,19 @@ void FaultSwitches::FailCommand(TextView command, HRESULT status, TextView text)
     std::lock_guard lock(mutex_);
     commandFailures_[Text(command)] =
         Failure{status, text.empty() ? Text(command) + OLESTR(": simulated failure") : Text(text)};
+    Rearm();
 }
 
 void FaultSwitches::ClearCommandFailure(TextView command) {
     std::lock_guard lock(mutex_);
     commandFailures_.erase(Text(command));
+    Rearm();
 }
 
 std::optional<Failure> FaultSwitches::FailureFor(TextView command) const {
+    if (!armed_) {
+        return std::nullopt;
+    }
     std::lock_guard lock(mutex_);
     const auto found = commandFailures_.find(command);
     if (found == commandFailures_.end()) {
@@ -79,6 +95,7 @@ void FaultSwitches::Clear() {
         std::lock_guard lock(mutex_);
         delays_.clear();
         commandFailures_.clear();
+        Rearm();
     }
     RestoreTransport();
 }

@@ -1,4 +1,5 @@
 #pragma once
+#include <atomic>
 #include <chrono>
 #include <functional>
 #include <map>
@@ -42,6 +43,12 @@ public:
     void OnTransportChange(std::function<void(bool up)> listener);
 
 private:
+    void Rearm();  // under mutex_
+
+    // Whether any delay or command failure is set: the common case, none,
+    // takes no lock.
+    std::atomic<bool> armed_{false};
+    std::atomic<bool> transportFailing_{false};
     mutable std::mutex mutex_;
     std::map<Text, std::chrono::milliseconds, std::less<>> delays_;
     std::map<Text, Failure, std::less<>> commandFailures_;

@@ -4,6 +4,19 @@
 
 namespace tav::sim {
 
+Text Concat(std::initializer_list<TextView> pieces) {
+    std::size_t size = 0;
+    for (TextView piece : pieces) {
+        size += piece.size();
+    }
+    Text text;
+    text.reserve(size);
+    for (TextView piece : pieces) {
+        text.append(piece);
+    }
+    return text;
+}
+
 Text Widen(std::string_view bytes) {
     Text text;
     text.reserve(bytes.size());

@@ -1,5 +1,6 @@
 #pragma once
 #include <concepts>
+#include <initializer_list>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -12,6 +13,9 @@ namespace tav::sim {
 
 using Text = std::basic_string<OLECHAR>;
 using TextView = std::basic_string_view<OLECHAR>;
+
+// The pieces one after the other, in one allocation.
+Text Concat(std::initializer_list<TextView> pieces);
 
 // Latin-1 bytes to text; what the controller writes into its replies.
 Text Widen(std::string_view bytes);

@@ -30,7 +30,8 @@ std::optional<Text> ValueOf(const Command& command, std::initializer_list<TextVi
 }
 
 Reply GetControllerName(ControllerModel& controller, const Command&) {
-    return Answer(OLESTR("-Name ") + Quoted(controller.Read([](const ModelState& state) { return state.name; })));
+    return Answer(controller.Read(
+        [](const ModelState& state) { return Concat({OLESTR("-Name \""), state.name, OLESTR("\"")}); }));
 }
 
 Reply SetControllerName(ControllerModel& controller, const Command& command) {
@@ -43,7 +44,8 @@ Reply SetControllerName(ControllerModel& controller, const Command& command) {
 }
 
 Reply GetControllerId(ControllerModel& controller, const Command&) {
-    return Answer(OLESTR("-ID ") + Quoted(controller.Read([](const ModelState& state) { return state.controllerId; })));
+    return Answer(controller.Read(
+        [](const ModelState& state) { return Concat({OLESTR("-ID \""), state.controllerId, OLESTR("\"")}); }));
 }
 
 // The identifier comes as -ctrlId, or as -Id when it is cleared.
