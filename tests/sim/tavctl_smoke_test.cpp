@@ -78,6 +78,31 @@ TEST_F(TavctlSmokeTest, BatchSetsAndReadsTheControllerName) {
     EXPECT_NE(std::string::npos, run.output.find("tavctl> name get\nSmoke test cell\n")) << run.output;
 }
 
+// The clock crosses the tool as ISO-8601 UTC and the module as FILETIME.
+TEST_F(TavctlSmokeTest, ClockTimesSurviveTheRoundTrip) {
+    const auto script = std::filesystem::temp_directory_path() / "tavctl-smoke-clock.txt";
+    const char* times[] = {"1970-01-01T00:00:00Z", "2024-02-29T23:59:59Z", "2106-02-07T06:28:15Z"};
+    {
+        std::ofstream file(script);
+        for (const char* time : times) {
+            file << "clock set " << time << "\nclock get\n";
+        }
+    }
+    const ToolRun run = RunTool(tool_, "batch \"" + script.string() + "\"");
+    std::filesystem::remove(script);
+    EXPECT_EQ(0, run.exitCode) << run.output;
+    // The clock runs on between set and get; a second at most.
+    EXPECT_NE(std::string::npos, run.output.find("1970-01-01T00:00:0")) << run.output;
+    const bool leapDay = run.output.find("2024-02-29T23:59:59Z\n") != std::string::npos ||
+                         run.output.find("2024-03-01T00:00:00Z\n") != std::string::npos;
+    EXPECT_TRUE(leapDay) << run.output;
+    EXPECT_NE(std::string::npos, run.output.find("2106-02-07T06:28:1")) << run.output;
+
+    for (const char* bad : {"2026-02-30T00:00:00Z", "2026-13-01T00:00:00Z", "2026-11-21T02:30:00", "yesterday"}) {
+        EXPECT_EQ(2, RunTool(tool_, std::string("clock set ") + bad).exitCode) << bad;
+    }
+}
+
 TEST_F(TavctlSmokeTest, FailurePrintsTheHresultItsNameAndTheLastError) {
     const ToolRun run = RunTool(tool_, "--sim-fail CtrlName=0x80070005 name get");
     EXPECT_EQ(1, run.exitCode) << run.output;

@@ -183,8 +183,9 @@ int Mode(Session& session, CommandArguments& args) {
 
 int Collision(Session& session, CommandArguments& args) {
     int status = kExitOk;
-    if (!args.Done() && args.Rest() != std::vector<std::string>{"get"}) {
-        return session.Usage("collision", "expected no argument or get");
+    const auto rest = args.Rest();
+    if (!rest.empty() && rest != std::vector<std::string>{"get"} && rest != std::vector<std::string>{"state"}) {
+        return session.Usage("collision", "expected no argument, get or state");
     }
     const auto panel = session.Interface<ITavPanel>("ITavPanel");
     if (!panel) {
@@ -267,7 +268,7 @@ constexpr CommandSpec kCommands[] = {
      "TavOperationMode name or number, for the module to refuse).\n",
      Mode},
     {"collision", "print the collision detection state",
-     "Usage: tavctl collision [get]\n"
+     "Usage: tavctl collision [get|state]\n"
      "GetCollisionDetectState.\n",
      Collision},
     {"ack", "acknowledge a mode change or a collision",
