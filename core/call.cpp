@@ -44,7 +44,7 @@ HRESULT NotifyCallback(ControllerObject& object, TavInParams* rip, HRESULT hr) {
 
 Call::Call(ControllerObject& object, TavInParams* rip) : object_(object), rip_(rip) {}
 
-Call& Call::ValidParams(OleStringView text, Where where) {
+Call& Call::ValidParams(const OLECHAR* text, Where where) {
     if (!failed() && !CallbackTrusted(rip_)) {
         // The callback is not to be trusted, so it is not told.
         hr_ = object_.Errors().Set(E_INVALIDARG, SiteOf(where), text);
@@ -52,11 +52,11 @@ Call& Call::ValidParams(OleStringView text, Where where) {
     return *this;
 }
 
-Call& Call::Initialised(OleStringView text, Where where) {
+Call& Call::Initialised(const OLECHAR* text, Where where) {
     return Require(object_.Initialised(), E_ABORT, text, where);
 }
 
-Call& Call::Require(bool ok, HRESULT hr, OleStringView text, Where where) {
+Call& Call::Require(bool ok, HRESULT hr, const OLECHAR* text, Where where) {
     if (!failed() && !ok) {
         Fail(hr, text, where);
     }

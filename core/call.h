@@ -86,18 +86,18 @@ public:
     Call(ControllerObject& object, TavInParams* rip);
 
     // Step 1: with a callback, riid must name ITavCommandCallback.
-    Call& ValidParams(OleStringView text, Where where = Where::current());
+    Call& ValidParams(const OLECHAR* text, Where where = Where::current());
     // Step 2.
     template <class T>
-    Call& OutPointer(T* out, OleStringView text, Where where = Where::current()) {
+    Call& OutPointer(T* out, const OLECHAR* text, Where where = Where::current()) {
         return Require(out != nullptr, E_POINTER, text, where);
     }
     // Step 3.
-    Call& Initialised(OleStringView text, Where where = Where::current());
+    Call& Initialised(const OLECHAR* text, Where where = Where::current());
     // Step 4: the operation's own checks.
-    Call& Require(bool ok, HRESULT hr, OleStringView text, Where where = Where::current());
+    Call& Require(bool ok, HRESULT hr, const OLECHAR* text, Where where = Where::current());
     template <class Check, class = std::enable_if_t<std::is_invocable_r_v<bool, Check>>>
-    Call& Require(Check&& check, HRESULT hr, OleStringView text, Where where = Where::current()) {
+    Call& Require(Check&& check, HRESULT hr, const OLECHAR* text, Where where = Where::current()) {
         return failed() ? *this : Require(std::forward<Check>(check)(), hr, text, where);
     }
 

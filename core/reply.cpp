@@ -19,21 +19,21 @@ constexpr size_t kFieldRoom = 1024;
 
 Reply::Reply(ControllerObject& object, VARIANT* data) : object_(object), data_(data) {}
 
-Reply& Reply::Initialised(OleStringView text, Where where) {
+Reply& Reply::Initialised(const OLECHAR* text, Where where) {
     if (!failed() && !object_.Initialised()) {
         Fail(E_ABORT, text, where);
     }
     return *this;
 }
 
-Reply& Reply::NotNull(OleStringView text, Where where) {
+Reply& Reply::NotNull(const OLECHAR* text, Where where) {
     if (!failed() && data_ == nullptr) {
         Fail(E_INVALIDARG, text, where);
     }
     return *this;
 }
 
-Reply& Reply::IsBstr(OleStringView text, Where where) {
+Reply& Reply::IsBstr(const OLECHAR* text, Where where) {
     if (!failed() && data_->vt != VT_BSTR) {
         Fail(E_FAIL, text, where);
     }
@@ -67,7 +67,7 @@ HRESULT Reply::QuotedString(OleStringView format, OleStringView emptyForm, BSTR*
     if (failed()) {
         return hr_;
     }
-    std::array<OLECHAR, kFieldRoom> field{};
+    std::array<OLECHAR, kFieldRoom> field;
     const OleStringView text = Text();
     OleStringView value;
     if (text::Scan(text, format, std::span<OLECHAR>(field)) == 1) {

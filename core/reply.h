@@ -28,11 +28,11 @@ public:
 
     Reply(ControllerObject& object, VARIANT* data);
 
-    Reply& Initialised(OleStringView text = OLESTR("TavController used before Initialized"),
+    Reply& Initialised(const OLECHAR* text = OLESTR("TavController used before Initialized"),
                        Where where = Where::current());
-    Reply& NotNull(OleStringView text, Where where = Where::current());
+    Reply& NotNull(const OLECHAR* text, Where where = Where::current());
     template <class T>
-    Reply& OutPointer(T* out, OleStringView text, Where where = Where::current()) {
+    Reply& OutPointer(T* out, const OLECHAR* text, Where where = Where::current()) {
         if (!failed() && out == nullptr) {
             Fail(E_POINTER, text, where);
         }
@@ -46,7 +46,7 @@ public:
         }
         return *this;
     }
-    Reply& IsBstr(OleStringView text, Where where = Where::current());
+    Reply& IsBstr(const OLECHAR* text, Where where = Where::current());
 
     // Decoding shapes shared by many operations. Each is the last step.
 
