@@ -1,5 +1,6 @@
 #include "module/type_library.h"
 
+#include "tav/bstr.h"
 #include "tav/com_ptr.h"
 
 namespace tav {
@@ -54,6 +55,12 @@ HRESULT UnregisterTypeLibrary(const OleString& modulePath, RegistrationScope sco
     }
     const TLIBATTR id = *attributes;
     library.Get()->ReleaseTLibAttr(attributes);
+    // Nothing registered is nothing to undo; the removal functions would
+    // call it an error.
+    Bstr registeredPath;
+    if (FAILED(QueryPathOfRegTypeLib(id.guid, id.wMajorVerNum, id.wMinorVerNum, id.lcid, registeredPath.Receive()))) {
+        return S_OK;
+    }
     if (scope == RegistrationScope::User) {
         if (auto unregisterForUser = FindInOleAutomation<UnregisterForUser>("UnRegisterTypeLibForUser")) {
             return unregisterForUser(id.guid, id.wMajorVerNum, id.wMinorVerNum, id.lcid, id.syskind);

@@ -2,6 +2,8 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cctype>
+#include <string_view>
 
 #include "module/server_registration.h"
 #include "module_test_support.h"
@@ -57,8 +59,13 @@ RegistrySnapshot ExpectedRegistration() {
 
 // The type library's own keys (Windows only) are checked on their own.
 RegistrySnapshot WithoutTypeLibraryKeys(RegistrySnapshot snapshot) {
-    std::erase_if(snapshot, [](const std::string& entry) {
-        return entry.rfind("TypeLib", 0) == 0 || entry.rfind("Interface", 0) == 0;
+    auto startsWith = [](const std::string& entry, std::string_view prefix) {
+        return entry.size() >= prefix.size() &&
+               std::equal(prefix.begin(), prefix.end(), entry.begin(),
+                          [](char a, char b) { return std::tolower(a) == std::tolower(b); });
+    };
+    std::erase_if(snapshot, [&](const std::string& entry) {
+        return startsWith(entry, "TypeLib") || startsWith(entry, "Interface");
     });
     return snapshot;
 }
@@ -82,29 +89,7 @@ protected:
     PerUserSwitch machine_{nullptr};
 };
 
-TEST_F(Registration, MachineRegistrationWritesEveryClassAndUnregistrationTakesItBack) {
-    ASSERT_EQ(DllRegisterServer(), S_OK);
-    const RegistrySnapshot first = TakeSnapshot(HKEY_LOCAL_MACHINE, kClassesKey);
-    EXPECT_EQ(MachineClasses(), ExpectedRegistration());
-    EXPECT_EQ(ReadString(HKEY_CLASSES_ROOT, "TavController.TavController3", ""), "TavController2 Class");
-    EXPECT_EQ(ReadString(HKEY_CLASSES_ROOT, "TavController.TavController3.1", ""), "TavController3 Class");
-    EXPECT_TRUE(UserClasses().empty());
-#ifdef _WIN32
-    EXPECT_TRUE(TypeLibraryRegistered(HKEY_LOCAL_MACHINE));
-#endif
-
-    ASSERT_EQ(DllRegisterServer(), S_OK);
-    EXPECT_EQ(TakeSnapshot(HKEY_LOCAL_MACHINE, kClassesKey), first) << "registering again changes nothing";
-
-    ASSERT_EQ(DllUnregisterServer(), S_OK);
-    EXPECT_EQ(MachineClasses(), RegistrySnapshot{"CLSID"}) << "CLSID is NoRemove, everything else goes";
-#ifdef _WIN32
-    EXPECT_FALSE(TypeLibraryRegistered(HKEY_LOCAL_MACHINE));
-#endif
-    EXPECT_EQ(DllUnregisterServer(), S_OK) << "unregistering what is not there is no error";
-}
-
-TEST_F(Registration, ForeignKeysAreReplacedOnlyBeneathForceRemove) {
+TEST_F(Registration, MachineRegistrationWritesEveryClassOverForeignKeysAndTakesItBack) {
     const std::string clsidKey = "CLSID\\" + GuidText(CLSID_TavController7);
     WriteString(HKEY_CLASSES_ROOT, clsidKey + "\\Stale", "", "left by an old version");
     WriteString(HKEY_CLASSES_ROOT, clsidKey, "Extra", "stale value");
@@ -116,11 +101,25 @@ TEST_F(Registration, ForeignKeysAreReplacedOnlyBeneathForceRemove) {
     ASSERT_EQ(DllRegisterServer(), S_OK);
     RegistrySnapshot expected = ExpectedRegistration();
     expected.insert(untouched.begin(), untouched.end());
-    EXPECT_EQ(MachineClasses(), expected);
+    EXPECT_EQ(MachineClasses(), expected) << "ForceRemove replaces the class key whole, other keys are kept";
+    EXPECT_EQ(ReadString(HKEY_CLASSES_ROOT, "TavController.TavController3", ""), "TavController2 Class");
+    EXPECT_EQ(ReadString(HKEY_CLASSES_ROOT, "TavController.TavController3.1", ""), "TavController3 Class");
+    EXPECT_TRUE(UserClasses().empty());
+#ifdef _WIN32
+    EXPECT_TRUE(TypeLibraryRegistered(HKEY_LOCAL_MACHINE));
+#endif
+
+    const RegistrySnapshot first = TakeSnapshot(HKEY_LOCAL_MACHINE, kClassesKey);
+    ASSERT_EQ(DllRegisterServer(), S_OK);
+    EXPECT_EQ(TakeSnapshot(HKEY_LOCAL_MACHINE, kClassesKey), first) << "registering again changes nothing";
 
     ASSERT_EQ(DllUnregisterServer(), S_OK);
     EXPECT_EQ(MachineClasses(), untouched)
-        << "a key holding foreign subkeys stays, without what the script wrote";
+        << "CLSID is NoRemove and a key holding foreign subkeys stays, without what the script wrote";
+#ifdef _WIN32
+    EXPECT_FALSE(TypeLibraryRegistered(HKEY_LOCAL_MACHINE));
+#endif
+    EXPECT_EQ(DllUnregisterServer(), S_OK) << "unregistering what is not there is no error";
 }
 
 TEST_F(Registration, PerUserRegistrationStaysBeneathTheUsersClasses) {
