@@ -8,12 +8,12 @@ namespace {
 
 ErrorSite SiteOf(const Where& where) { return ErrorSite{static_cast<int>(where.line())}; }
 
-bool CallbackTrusted(const TavInParams* rip) {
+}  // namespace
+
+bool ValidInParams(const TavInParams* rip) {
     return rip == nullptr || rip->pCallback == nullptr ||
            (rip->riid != nullptr && IsEqualGUID(*rip->riid, IID_ITavCommandCallback));
 }
-
-}  // namespace
 
 CommandReply::CommandReply() : record_{} { VariantInit(&record_.data); }
 
@@ -45,7 +45,7 @@ HRESULT NotifyCallback(ControllerObject& object, TavInParams* rip, HRESULT hr) {
 Call::Call(ControllerObject& object, TavInParams* rip) : object_(object), rip_(rip) {}
 
 Call& Call::ValidParams(const OLECHAR* text, Where where) {
-    if (!failed() && !CallbackTrusted(rip_)) {
+    if (!failed() && !ValidInParams(rip_)) {
         // The callback is not to be trusted, so it is not told.
         hr_ = object_.Errors().Set(E_INVALIDARG, SiteOf(where), text);
     }

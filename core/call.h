@@ -126,6 +126,10 @@ private:
 // last-error text when hr is a failure; returns hr.
 HRESULT NotifyCallback(ControllerObject& object, TavInParams* rip, HRESULT hr);
 
+// The TavInParams check: with a callback, riid must name ITavCommandCallback.
+// A NULL record or a NULL callback passes without riid being read.
+bool ValidInParams(const TavInParams* rip);
+
 // True when a call with these parameters returns before its reply arrives.
 inline bool IsAsync(const TavInParams* rip) { return rip != nullptr && rip->callType != Sync; }
 

@@ -44,6 +44,14 @@ HRESULT ErrorInfo::Set(HRESULT hr, ErrorSite site, OleStringView message) {
     return hr;
 }
 
+HRESULT ErrorInfo::SetWithShortSuffix(HRESULT hr, ErrorSite site, OleStringView message) {
+    OleString text(message.substr(0, kMessageRoom));
+    text += text::Widen(kErrorSource);
+    text += text::Format(OLESTR("[%d];"), site.line);
+    Replace(std::move(text));
+    return hr;
+}
+
 HRESULT ErrorInfo::AdoptFromComponent(HRESULT hr, IUnknown* component, ErrorSite site) {
     OleString text;
     ComPtr<ITavComError> errors;

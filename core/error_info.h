@@ -18,6 +18,9 @@ public:
 
     // A failure detected on this side: message, then ":TavControllerImpl[line]; ".
     HRESULT Set(HRESULT hr, ErrorSite site, OleStringView message);
+    // The same with the short suffix "TavControllerImpl[line];" that the
+    // subscription type check writes.
+    HRESULT SetWithShortSuffix(HRESULT hr, ErrorSite site, OleStringView message);
     // A failure of a sibling component: its own text (fetched through its
     // error interface, when it has one), then "TavControllerImpl[line]; ".
     HRESULT AdoptFromComponent(HRESULT hr, IUnknown* component, ErrorSite site);
