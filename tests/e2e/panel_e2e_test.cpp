@@ -11,7 +11,8 @@ namespace {
 
 using PanelE2eTest = VirtualControllerTest;
 
-// Collects what the controller delivers: command replies and events.
+// Collects what the controller delivers: command replies and events. The
+// controller's threads may hold it after a test ends, so it lives on the heap.
 class Listener final : public ITavCommandCallback, public _ITavObjectEvents {
 public:
     HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override {
@@ -27,7 +28,13 @@ public:
         return S_OK;
     }
     ULONG STDMETHODCALLTYPE AddRef() override { return ++references_; }
-    ULONG STDMETHODCALLTYPE Release() override { return --references_; }
+    ULONG STDMETHODCALLTYPE Release() override {
+        const ULONG left = --references_;
+        if (left == 0) {
+            delete this;
+        }
+        return left;
+    }
 
     HRESULT STDMETHODCALLTYPE OnCommandReply(TavCommandReply* reply) override {
         std::lock_guard hold(mutex_);
@@ -128,7 +135,9 @@ TEST_F(PanelE2eTest, CollisionStateIsDecoded) {
 }
 
 TEST_F(PanelE2eTest, StateAndModeEventsReachTheSink) {
-    Listener listener;
+    ComPtr<Listener> holder;
+    holder.Attach(new Listener);
+    Listener& listener = *holder.Get();
     TavEventParams params{};
     params.riid = const_cast<GUID*>(&IID__ITavObjectEvents);
     params.pSink = static_cast<_ITavObjectEvents*>(&listener);
@@ -158,7 +167,9 @@ TEST_F(PanelE2eTest, StateAndModeEventsReachTheSink) {
 }
 
 TEST_F(PanelE2eTest, AsynchronousCallDeliversItsReplyToTheCallback) {
-    Listener listener;
+    ComPtr<Listener> holder;
+    holder.Attach(new Listener);
+    Listener& listener = *holder.Get();
     TavInParams rip{};
     rip.riid = const_cast<GUID*>(&IID_ITavCommandCallback);
     rip.pCallback = static_cast<ITavCommandCallback*>(&listener);
