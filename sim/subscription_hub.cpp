@@ -29,9 +29,8 @@ FILETIME FileTimeOf(std::uint32_t seconds) {
 
 struct SubscriptionHub::Subscription {
     SubscriptionRequest request;
-    Text lastText;
-    bool dirty = false;
-    std::deque<Text> pulses;
+    Text lastQueued;  // value events: the text queued last
+    std::deque<Text> queued;
     std::optional<Clock::duration> period;
     Clock::time_point nextPoll;
 };
@@ -39,14 +38,9 @@ struct SubscriptionHub::Subscription {
 struct SubscriptionHub::Delivery {
     ULONG cookie = 0;
     ComPtr<_ITavObjectEvents> sink;
-    const EventRow* event = nullptr;
-    Arguments eventArgs;
     ULONG userDef = 0;
     TavContainData containData = Data;
-    std::deque<Text> pulses;
-    bool lookAtValue = false;
-    Text lastText;
-    std::optional<Text> newLastText;
+    std::deque<Text> texts;
 };
 
 SubscriptionHub::SubscriptionHub(std::shared_ptr<ControllerModel> controller) : controller_(std::move(controller)) {}
@@ -56,7 +50,7 @@ SubscriptionHub::~SubscriptionHub() { Stop(); }
 ULONG SubscriptionHub::Add(SubscriptionRequest request) {
     Subscription subscription;
     if (request.event->style == EventStyle::Value) {
-        subscription.lastText = controller_->Read(
+        subscription.lastQueued = controller_->Read(
             [&](const ModelState& state) { return request.event->current(state, request.eventArgs); });
     }
     if (request.pollTime != 0 && request.pollTime < kNeverPolled) {
@@ -127,13 +121,40 @@ void SubscriptionHub::Stop() {
 void SubscriptionHub::OnModelChanged() {
     {
         std::lock_guard lock(mutex_);
-        for (auto& [cookie, subscription] : subscriptions_) {
-            if (subscription.request.event->style == EventStyle::Value) {
-                subscription.dirty = true;
-            }
-        }
+        QueueChangedValues(false, Clock::now());
     }
     wake_.notify_all();
+}
+
+// The controller's lock is taken inside the hub's; never the other way round
+// (the controller calls its listeners only after leaving its lock).
+void SubscriptionHub::QueueChangedValues(bool dueOnly, Clock::time_point now) {
+    std::vector<Subscription*> looked;
+    for (auto& [cookie, subscription] : subscriptions_) {
+        if (subscription.request.event->style != EventStyle::Value) {
+            continue;
+        }
+        if (dueOnly) {
+            if (!subscription.period || now < subscription.nextPoll) {
+                continue;
+            }
+            subscription.nextPoll = now + *subscription.period;
+        }
+        looked.push_back(&subscription);
+    }
+    if (looked.empty()) {
+        return;
+    }
+    controller_->Read([&](const ModelState& state) {
+        for (Subscription* subscription : looked) {
+            const SubscriptionRequest& request = subscription->request;
+            Text current = request.event->current(state, request.eventArgs);
+            if (current != subscription->lastQueued) {
+                subscription->queued.push_back(current);
+                subscription->lastQueued = std::move(current);
+            }
+        }
+    });
 }
 
 void SubscriptionHub::OnModelEvent(TextView eventName, TextView text) {
@@ -142,7 +163,7 @@ void SubscriptionHub::OnModelEvent(TextView eventName, TextView text) {
         for (auto& [cookie, subscription] : subscriptions_) {
             const EventRow& event = *subscription.request.event;
             if (event.style == EventStyle::Pulse && event.name == eventName) {
-                subscription.pulses.emplace_back(text);
+                subscription.queued.emplace_back(text);
             }
         }
     }
@@ -152,17 +173,23 @@ void SubscriptionHub::OnModelEvent(TextView eventName, TextView text) {
 void SubscriptionHub::Run() {
     std::unique_lock lock(mutex_);
     while (!stopping_) {
+        QueueChangedValues(true, Clock::now());
         Delivery delivery;
-        if (TakeDelivery(Clock::now(), delivery)) {
+        if (TakeDelivery(delivery)) {
             delivering_ = delivery.cookie;
             lock.unlock();
-            Deliver(delivery);
+            for (std::size_t i = 0; i < delivery.texts.size(); ++i) {
+                if (i > 0) {
+                    // The sink may have unsubscribed in its OnChange.
+                    std::lock_guard check(mutex_);
+                    if (stopping_ || !subscriptions_.contains(delivery.cookie)) {
+                        break;
+                    }
+                }
+                Send(delivery, delivery.texts[i]);
+            }
             delivery.sink = nullptr;
             lock.lock();
-            const auto found = subscriptions_.find(delivery.cookie);
-            if (found != subscriptions_.end() && delivery.newLastText) {
-                found->second.lastText = std::move(*delivery.newLastText);
-            }
             delivering_ = 0;
             delivered_.notify_all();
             continue;
@@ -176,37 +203,23 @@ void SubscriptionHub::Run() {
     }
 }
 
-// Takes the work of the first subscription after the one served last that has
-// any, so that a busy subscription cannot starve the others.
-bool SubscriptionHub::TakeDelivery(Clock::time_point now, Delivery& delivery) {
-    auto due = [now](const Subscription& s) {
-        return !s.pulses.empty() || s.dirty || (s.period && now >= s.nextPoll);
-    };
-    auto found = std::find_if(subscriptions_.upper_bound(lastServed_), subscriptions_.end(),
-                              [&](const auto& entry) { return due(entry.second); });
+// Takes the queued events of the first subscription after the one served
+// last that has any, so that a busy subscription cannot starve the others.
+bool SubscriptionHub::TakeDelivery(Delivery& delivery) {
+    auto waiting = [](const auto& entry) { return !entry.second.queued.empty(); };
+    auto found = std::find_if(subscriptions_.upper_bound(lastServed_), subscriptions_.end(), waiting);
     if (found == subscriptions_.end()) {
-        found = std::find_if(subscriptions_.begin(), subscriptions_.end(),
-                             [&](const auto& entry) { return due(entry.second); });
+        found = std::find_if(subscriptions_.begin(), subscriptions_.end(), waiting);
     }
     if (found == subscriptions_.end()) {
         return false;
     }
-    Subscription& subscription = found->second;
-    const SubscriptionRequest& request = subscription.request;
+    const SubscriptionRequest& request = found->second.request;
     delivery.cookie = found->first;
     delivery.sink = request.sink;
-    delivery.event = request.event;
-    delivery.eventArgs = request.eventArgs;
     delivery.userDef = request.userDef;
     delivery.containData = request.containData;
-    delivery.pulses.swap(subscription.pulses);
-    delivery.lookAtValue = request.event->style == EventStyle::Value &&
-                           (subscription.dirty || (subscription.period && now >= subscription.nextPoll));
-    delivery.lastText = subscription.lastText;
-    subscription.dirty = false;
-    if (subscription.period && now >= subscription.nextPoll) {
-        subscription.nextPoll = now + *subscription.period;
-    }
+    delivery.texts.swap(found->second.queued);
     lastServed_ = found->first;
     return true;
 }
@@ -219,20 +232,6 @@ Clock::time_point SubscriptionHub::NextPoll() const {
         }
     }
     return next;
-}
-
-void SubscriptionHub::Deliver(Delivery& delivery) {
-    for (const Text& text : delivery.pulses) {
-        Send(delivery, text);
-    }
-    if (delivery.lookAtValue) {
-        Text current = controller_->Read(
-            [&](const ModelState& state) { return delivery.event->current(state, delivery.eventArgs); });
-        if (current != delivery.lastText) {
-            Send(delivery, current);
-            delivery.newLastText = std::move(current);
-        }
-    }
 }
 
 void SubscriptionHub::Send(Delivery& delivery, TextView text) {

@@ -26,10 +26,11 @@ struct SubscriptionRequest {
 
 // The subscriptions of one command component on its controller, and the
 // thread that delivers their events through _ITavObjectEvents::OnChange.
-// Value events are delivered when their text differs from the one delivered
-// last (looked at on every change of the controller and every poll period);
-// pulse events each time they are posted. Sinks are called without any lock
-// held.
+// A value event is queued whenever its text differs from the one queued last,
+// looked at right after every change of the controller (so that quick
+// successive changes each give an event) and every poll period; a pulse event
+// each time it is posted. Each subscription's events go out in order; sinks
+// are called without any lock held.
 class SubscriptionHub : public ModelListener, public std::enable_shared_from_this<SubscriptionHub> {
 public:
     explicit SubscriptionHub(std::shared_ptr<ControllerModel> controller);
@@ -55,9 +56,11 @@ private:
     struct Delivery;
 
     void Run();
-    bool TakeDelivery(std::chrono::steady_clock::time_point now, Delivery& delivery);
+    // Queues the value events whose text changed; under mutex_. With
+    // `dueOnly`, only the subscriptions whose poll period has come.
+    void QueueChangedValues(bool dueOnly, std::chrono::steady_clock::time_point now);
+    bool TakeDelivery(Delivery& delivery);
     std::chrono::steady_clock::time_point NextPoll() const;
-    void Deliver(Delivery& delivery);
     void Send(Delivery& delivery, TextView text);
 
     const std::shared_ptr<ControllerModel> controller_;

@@ -48,12 +48,9 @@ TEST_F(SubscriptionTest, ModeEventsFollowTheChangeToAutomatic) {
     Ref<EventCollector> conditions(new EventCollector);
     ASSERT_NE(0u, Subscribe(conditions.get(), "AutoCondSub"));
 
-    // A value event tells the value current when it is delivered, so each
-    // step waits for both before the next changes the mode again.
+    // Every change gives its event, however quickly the next one follows.
     ASSERT_EQ(S_OK, Set("OPMode", "-opmode auto").status);
-    ASSERT_TRUE(sink->WaitFor(1) && conditions->WaitFor(1));
     ASSERT_EQ(S_OK, Set("AutoCondAck", "-AutoCondAck Reset -ID 1").status);
-    ASSERT_TRUE(sink->WaitFor(2) && conditions->WaitFor(2));
     ASSERT_EQ(S_OK, Set("Ack", "AUTO").status);
     ASSERT_TRUE(sink->WaitFor(3) && conditions->WaitFor(3));
 
