@@ -14,7 +14,7 @@ void ReleaseClassObjects();
 
 // Makes every class creatable through CoCreateInstance in this process
 // without a registry entry (hosts that link the module statically), and
-// takes the registrations back.
+// takes the registrations back. Both are called from one thread at a time.
 HRESULT RegisterClassObjects(DWORD context, DWORD flags);
 void RevokeClassObjects();
 

@@ -2,6 +2,7 @@
 // lock count.
 #include <gtest/gtest.h>
 
+#include "core/enumerators.h"
 #include "core/module_lock.h"
 #include "module/class_objects.h"
 #include "module_test_support.h"
@@ -87,6 +88,24 @@ TEST_F(ClassObjects, UnloadIsRefusedWhileAnythingLives) {
     ASSERT_EQ(ClassObjectFor(kClasses[16], factory), S_OK);
     EXPECT_EQ(factory->LockServer(FALSE), S_OK);
     factory.Reset();
+    EXPECT_EQ(DllCanUnloadNow(), S_OK);
+}
+
+TEST_F(ClassObjects, UnloadIsRefusedWhileAnEnumeratorOutlivesItsController) {
+    ComPtr<IClassFactory> factory;
+    ASSERT_EQ(ClassObjectFor(kClasses[16], factory), S_OK);
+    ComPtr<IUnknown> controller;
+    ASSERT_EQ(factory->CreateInstance(nullptr, IID_IUnknown, Out(controller)), S_OK);
+    factory.Reset();
+
+    TavAutoCondition conditions[2] = {};
+    ComPtr<IEnumAutoCondition> enumerator;
+    ASSERT_EQ(MakeEnumerator<AutoConditionTraits>(conditions, conditions + 2, controller.Get(), EnumOwnership::Copy,
+                                                  &enumerator),
+              S_OK);
+    controller.Reset();
+    EXPECT_EQ(DllCanUnloadNow(), S_FALSE);
+    enumerator.Reset();
     EXPECT_EQ(DllCanUnloadNow(), S_OK);
 }
 
