@@ -160,7 +160,9 @@ LSTATUS RegistryStore::Save() {
         struct stat status;
         if (stat(path_.c_str(), &status) == 0) fchmod(descriptor, status.st_mode & 07777);
     }
-    ok = ok && WriteAll(descriptor, text) && fdatasync(descriptor) == 0;
+    // The rename makes each change atomic for every reader; durability across
+    // a power cut is not worth a disk flush per value written.
+    ok = ok && WriteAll(descriptor, text);
     if (descriptor >= 0) ok = close(descriptor) == 0 && ok;
     ok = ok && rename(temporary.c_str(), path_.c_str()) == 0;
     if (!ok) {
