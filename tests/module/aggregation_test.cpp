@@ -64,17 +64,6 @@ TEST_P(Aggregation, InterfacesDelegateToTheOuterObject) {
     EXPECT_EQ(DllCanUnloadNow(), S_FALSE) << "the class object is still held";
 }
 
-TEST_P(Aggregation, InnerObjectKeepsTheClassInterfaceSet) {
-    ASSERT_EQ(factory_->CreateInstance(&outer_, IID_IUnknown, reinterpret_cast<void**>(&outer_.inner)), S_OK);
-    void* raw = nullptr;
-    const HRESULT expected = GetParam().version >= 17 ? S_OK : E_NOINTERFACE;
-    EXPECT_EQ(outer_.inner->QueryInterface(IID_ITavPanel4, &raw), expected);
-    if (raw != nullptr) {
-        static_cast<IUnknown*>(raw)->Release();
-    }
-    outer_.inner->Release();
-}
-
 TEST_P(Aggregation, OuterObjectWithAnotherInterfaceIsRefused) {
     void* raw = reinterpret_cast<void*>(1);
     EXPECT_EQ(factory_->CreateInstance(&outer_, IID_ITavController, &raw), CLASS_E_NOAGGREGATION);

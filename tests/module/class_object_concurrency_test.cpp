@@ -45,31 +45,5 @@ TEST(ClassObjectConcurrency, SimultaneousFirstUseMakesOneClassObjectPerClass) {
     EXPECT_EQ(DllCanUnloadNow(), S_OK);
 }
 
-TEST(ClassObjectConcurrency, ObjectsCreatedAndReleasedOnManyThreadsBalanceTheLockCount) {
-    constexpr int kThreads = 8;
-    std::latch start(kThreads);
-    std::vector<std::thread> threads;
-    for (int t = 0; t < kThreads; ++t) {
-        threads.emplace_back([&, t] {
-            start.arrive_and_wait();
-            for (int i = 0; i < 50; ++i) {
-                ComPtr<IClassFactory> factory;
-                if (ClassObjectFor(kClasses[(t + i) % kClasses.size()], factory) != S_OK) {
-                    ADD_FAILURE() << "no class object";
-                    return;
-                }
-                ComPtr<ITavController> object;
-                EXPECT_EQ(factory->CreateInstance(nullptr, IID_ITavController, Out(object)), S_OK);
-                factory->LockServer(TRUE);
-                factory->LockServer(FALSE);
-            }
-        });
-    }
-    for (std::thread& thread : threads) {
-        thread.join();
-    }
-    EXPECT_EQ(DllCanUnloadNow(), S_OK);
-}
-
 }  // namespace
 }  // namespace tav::test

@@ -54,16 +54,6 @@ TEST_F(ClassObjects, CreateInstanceRefusesBadArgumentsWithoutLeaking) {
     EXPECT_EQ(ModuleLock::Count(), 1) << "only the held class object may remain";
 }
 
-TEST_F(ClassObjects, EachInstanceIsANewObject) {
-    ComPtr<IClassFactory> factory;
-    ASSERT_EQ(ClassObjectFor(kClasses[7], factory), S_OK);
-    ComPtr<ITavIPC> a;
-    ComPtr<ITavIPC> b;
-    ASSERT_EQ(factory->CreateInstance(nullptr, IID_ITavIPC, Out(a)), S_OK);
-    ASSERT_EQ(factory->CreateInstance(nullptr, IID_ITavIPC, Out(b)), S_OK);
-    EXPECT_NE(a.Get(), b.Get());
-}
-
 TEST_F(ClassObjects, UnloadIsRefusedWhileAnythingLives) {
     ComPtr<IClassFactory> factory;
     ASSERT_EQ(ClassObjectFor(kClasses[16], factory), S_OK);
