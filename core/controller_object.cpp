@@ -28,7 +28,7 @@ HRESULT ControllerObject::Create(LONG version, IUnknown* outer, REFIID riid, voi
     if (outer != nullptr && !IsEqualIID(riid, IID_IUnknown)) {
         return CLASS_E_NOAGGREGATION;
     }
-    auto* created = new (std::nothrow) ControllerObject(version, outer);
+    ControllerObject* created = Allocate(version, outer);
     if (created == nullptr) {
         return E_OUTOFMEMORY;
     }

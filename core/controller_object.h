@@ -15,7 +15,7 @@ namespace tav {
 // The one controller object behind all seventeen classes. The classes differ
 // only in the class version stamped at construction, which decides what
 // QueryInterface answers and gates the newer features.
-class ControllerObject final : public ITavController6,
+class ControllerObject : public ITavController6,
                          public ITavBackupRestore2,
                          public ITavLANAdaptor2,
                          public ITavBoot3,
@@ -69,9 +69,14 @@ public:
     // Answers riid when the class version has it; otherwise E_NOINTERFACE.
     HRESULT FindInterface(REFIID riid, void** object);
 
-private:
+protected:
+    // Objects are made by Create, as the interface-guarding subclass of
+    // controller_interfaces.cpp, and destroyed by their last Release.
     explicit ControllerObject(LONG version, IUnknown* outer);
-    ~ControllerObject();
+    virtual ~ControllerObject();
+
+private:
+    static ControllerObject* Allocate(LONG version, IUnknown* outer);
     ControllerObject(const ControllerObject&) = delete;
     ControllerObject& operator=(const ControllerObject&) = delete;
 
