@@ -4,6 +4,7 @@
 #include <string_view>
 
 #include "core/text/ole_string.h"
+#include "tav/utf8.h"
 
 namespace tav::text {
 
@@ -17,15 +18,9 @@ std::string Narrow(OleStringView text);
 
 namespace detail {
 
-// Reads one code point from UTF-8, advancing p; malformed input gives U+FFFD.
-char32_t NextCodePoint(const char*& p, const char* last) noexcept;
-
-// The UTF-16 form of a code point: one unit, or a surrogate pair.
-struct Utf16Units {
-    OLECHAR unit[2];
-    std::size_t count;
-};
-Utf16Units ToUtf16(char32_t c) noexcept;
+using utf8::NextCodePoint;
+using utf8::ToUtf16;
+using utf8::Utf16Units;
 
 }  // namespace detail
 }  // namespace tav::text
