@@ -14,8 +14,7 @@
 #include "TavController.h"
 #include "core/text/format.h"
 #include "core/text/scan.h"
-#include "module/server_exports.h"
-#include "sim/virtual_controller.h"
+#include "bench_support.h"
 #include "tav/bstr.h"
 #include "tav/com_ptr.h"
 #include "tav/variant.h"
@@ -30,50 +29,20 @@ using tav::OleStringView;
 // As long as a name gets on a real cell, well under the 256 the controller keeps.
 constexpr OleStringView kName = OLESTR("Robot cell 1 of the east wing");
 
-// The process as a client sets it up: COM, the virtual controller registered
-// in-process, and a controller object from the module's class object,
-// initialised with the virtual controller's URL and named kName.
-class Client {
+// The process as a client sets it up, with the controller named kName.
+class Client : public tav::bench::Client {
 public:
     Client() {
-        comInitialised_ = SUCCEEDED(CoInitializeEx(nullptr, COINIT_MULTITHREADED));
-        simulator_ = tav::sim::RegisterInProcess();
-        if (!simulator_) {
-            failure_ = "cannot register the virtual controller";
+        if (Failure() != nullptr) {
             return;
         }
-        ComPtr<IClassFactory> factory;
-        if (FAILED(DllGetClassObject(CLSID_TavController, IID_IClassFactory, reinterpret_cast<void**>(&factory))) ||
-            FAILED(factory->CreateInstance(nullptr, IID_ITavController, reinterpret_cast<void**>(&controller_)))) {
-            failure_ = "cannot create a TavController object";
-            return;
-        }
-        const Bstr url(tav::sim::kDefaultUrl);
         const Bstr name(kName);
         TavInParams sync{};
         sync.callType = Sync;
-        if (FAILED(controller_->Init(url.Get())) || FAILED(controller_->SetControllerName(&sync, name.Get()))) {
-            failure_ = "cannot initialise and name the controller";
-            controller_ = nullptr;
+        if (FAILED(Controller()->SetControllerName(&sync, name.Get()))) {
+            Fail("cannot name the controller");
         }
     }
-
-    ~Client() {
-        controller_ = nullptr;
-        simulator_.Revoke();
-        if (comInitialised_) {
-            CoUninitialize();
-        }
-    }
-
-    ITavController* Controller() const { return controller_.Get(); }
-    const char* Failure() const { return failure_; }
-
-private:
-    bool comInitialised_ = false;
-    tav::sim::InProcessRegistration simulator_;
-    ComPtr<ITavController> controller_;
-    const char* failure_ = nullptr;
 };
 
 Client* TheClient = nullptr;
@@ -149,26 +118,8 @@ void Floor(benchmark::State& state) {
 
 // The usual console output, then the call's CPU time as a multiple of the
 // floor's: the median of the repetitions when there are several.
-class RatioReporter : public benchmark::ConsoleReporter {
+class RatioReporter : public tav::bench::MedianReporter {
 public:
-    // Plain text, so that the figures can be pasted as they are.
-    RatioReporter() : ConsoleReporter(OO_Tabular) {}
-
-    void ReportRuns(const std::vector<Run>& runs) override {
-        ConsoleReporter::ReportRuns(runs);
-        for (const Run& run : runs) {
-            if (run.error_occurred) {
-                continue;
-            }
-            Timings& timings = timings_[run.run_name.function_name];
-            if (run.run_type == Run::RT_Iteration) {
-                timings.repetitions.push_back(run.GetAdjustedCPUTime());
-            } else if (run.aggregate_name == "median") {
-                timings.median = run.GetAdjustedCPUTime();
-            }
-        }
-    }
-
     void Finalize() override {
         ConsoleReporter::Finalize();
         const double call = Median("GetControllerName/call");
@@ -183,23 +134,6 @@ public:
         GetOutputStream() << line;
     }
 
-private:
-    struct Timings {
-        std::vector<double> repetitions;
-        double median = 0;
-    };
-
-    double Median(const std::string& name) {
-        Timings& timings = timings_[name];
-        if (timings.median > 0 || timings.repetitions.empty()) {
-            return timings.median;
-        }
-        std::vector<double>& all = timings.repetitions;
-        std::nth_element(all.begin(), all.begin() + all.size() / 2, all.end());
-        return all[all.size() / 2];
-    }
-
-    std::map<std::string, Timings> timings_;
 };
 
 }  // namespace

@@ -17,8 +17,7 @@
 #include "TavController.h"
 #include "core/text/format.h"
 #include "core/text/scan.h"
-#include "module/server_exports.h"
-#include "sim/virtual_controller.h"
+#include "bench_support.h"
 #include "tav/bstr.h"
 #include "tav/com_ptr.h"
 #include "tav/variant.h"
@@ -32,49 +31,21 @@ using tav::OleStringView;
 
 constexpr std::int64_t kSizes[] = {10, 1'000, 100'000};
 
-// The process as a client sets it up: COM, the virtual controller registered
-// in-process (Unpack operations refuse an object that was not initialised),
-// and a controller object from the module's class object, as ITavPanel.
-class Client {
+// The process as a client sets it up (Unpack operations refuse an object
+// that was not initialised), seen through ITavPanel.
+class Client : public tav::bench::Client {
 public:
     Client() {
-        comInitialised_ = SUCCEEDED(CoInitializeEx(nullptr, COINIT_MULTITHREADED));
-        simulator_ = tav::sim::RegisterInProcess();
-        if (!simulator_) {
-            failure_ = "cannot register the virtual controller";
-            return;
-        }
-        ComPtr<IClassFactory> factory;
-        if (FAILED(DllGetClassObject(CLSID_TavController, IID_IClassFactory, reinterpret_cast<void**>(&factory))) ||
-            FAILED(factory->CreateInstance(nullptr, IID_ITavController, reinterpret_cast<void**>(&controller_)))) {
-            failure_ = "cannot create a TavController object";
-            return;
-        }
-        const Bstr url(tav::sim::kDefaultUrl);
-        if (FAILED(controller_->Init(url.Get())) ||
-            FAILED(controller_->QueryInterface(IID_ITavPanel, reinterpret_cast<void**>(&panel_)))) {
-            failure_ = "cannot initialise the controller or reach its ITavPanel";
-        }
-    }
-
-    ~Client() {
-        panel_ = nullptr;
-        controller_ = nullptr;
-        simulator_.Revoke();
-        if (comInitialised_) {
-            CoUninitialize();
+        if (Failure() == nullptr &&
+            FAILED(Controller()->QueryInterface(IID_ITavPanel, reinterpret_cast<void**>(&panel_)))) {
+            Fail("cannot reach the controller's ITavPanel");
         }
     }
 
     ITavPanel* Panel() const { return panel_.Get(); }
-    const char* Failure() const { return failure_; }
 
 private:
-    bool comInitialised_ = false;
-    tav::sim::InProcessRegistration simulator_;
-    ComPtr<ITavController> controller_;
     ComPtr<ITavPanel> panel_;
-    const char* failure_ = nullptr;
 };
 
 Client* TheClient = nullptr;
@@ -204,26 +175,8 @@ void Baseline(benchmark::State& state) {
 // The usual console output, then per size the time per element of both and
 // their ratio, from CPU time: the median of the repetitions when there are
 // several.
-class RatioReporter : public benchmark::ConsoleReporter {
+class RatioReporter : public tav::bench::MedianReporter {
 public:
-    // Plain text, so that the figures can be pasted as they are.
-    RatioReporter() : ConsoleReporter(OO_Tabular) {}
-
-    void ReportRuns(const std::vector<Run>& runs) override {
-        ConsoleReporter::ReportRuns(runs);
-        for (const Run& run : runs) {
-            if (run.error_occurred) {
-                continue;
-            }
-            Timings& timings = timings_[run.benchmark_name().substr(0, run.benchmark_name().find('_'))];
-            if (run.run_type == Run::RT_Iteration) {
-                timings.repetitions.push_back(run.GetAdjustedCPUTime());
-            } else if (run.aggregate_name == "median") {
-                timings.median = run.GetAdjustedCPUTime();
-            }
-        }
-    }
-
     void Finalize() override {
         ConsoleReporter::Finalize();
         std::ostream& out = GetOutputStream();
@@ -252,23 +205,6 @@ public:
         }
     }
 
-private:
-    struct Timings {
-        std::vector<double> repetitions;
-        double median = 0;
-    };
-
-    double Median(const std::string& name) {
-        Timings& timings = timings_[name];
-        if (timings.median > 0 || timings.repetitions.empty()) {
-            return timings.median;
-        }
-        std::vector<double>& all = timings.repetitions;
-        std::nth_element(all.begin(), all.begin() + all.size() / 2, all.end());
-        return all[all.size() / 2];
-    }
-
-    std::map<std::string, Timings> timings_;
 };
 
 }  // namespace
