@@ -18,6 +18,18 @@ struct WordValue {
     E value;
 };
 
+// text equals the NUL-terminated word, compared in one pass (a table's words
+// are never measured first).
+inline bool IsWord(OleStringView text, const OLECHAR* word) {
+    size_t i = 0;
+    for (; word[i] != 0; ++i) {
+        if (i == text.size() || text[i] != word[i]) {
+            return false;
+        }
+    }
+    return i == text.size();
+}
+
 // The checks that every Unpack operation runs, in their order (initialised,
 // VARIANT, out-pointers, clearing the out-values, VARIANT type), then the
 // decoding of the reply text. After the first failure every later step is
@@ -68,7 +80,7 @@ public:
             return hr_;
         }
         for (const auto& entry : table) {
-            if (word == entry.word) {
+            if (IsWord(word, entry.word)) {
                 *out = entry.value;
                 return S_OK;
             }

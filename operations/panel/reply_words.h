@@ -20,7 +20,7 @@ inline OleStringView ReplyText(const Reply& reply) {
 template <class E>
 std::optional<E> FindWord(OleStringView word, std::initializer_list<WordValue<E>> table) {
     for (const auto& entry : table) {
-        if (word == entry.word) {
+        if (IsWord(word, entry.word)) {
             return entry.value;
         }
     }
