@@ -6,20 +6,10 @@
 #include <new>
 
 #include "core/controller_object.h"
+#include "tav/guarded.h"
 
 namespace tav {
 namespace {
-
-// The result of the exception being handled.
-HRESULT ResultOfException() noexcept {
-    try {
-        throw;
-    } catch (const std::bad_alloc&) {
-        return E_OUTOFMEMORY;
-    } catch (...) {
-        return E_UNEXPECTED;
-    }
-}
 
 class ControllerInterfaces final : public ControllerObject {
 public:

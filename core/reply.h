@@ -1,5 +1,6 @@
 #pragma once
 #include <initializer_list>
+#include <optional>
 #include <source_location>
 #include <type_traits>
 #include <utility>
@@ -28,6 +29,17 @@ inline bool IsWord(OleStringView text, const OLECHAR* word) {
         }
     }
     return i == text.size();
+}
+
+// The value of word in table (exact, case-sensitive, first match wins).
+template <class E>
+std::optional<E> FindWord(OleStringView word, std::initializer_list<WordValue<E>> table) {
+    for (const auto& entry : table) {
+        if (IsWord(word, entry.word)) {
+            return entry.value;
+        }
+    }
+    return std::nullopt;
 }
 
 // The checks that every Unpack operation runs, in their order (initialised,
@@ -79,11 +91,9 @@ public:
         if (failed()) {
             return hr_;
         }
-        for (const auto& entry : table) {
-            if (IsWord(word, entry.word)) {
-                *out = entry.value;
-                return S_OK;
-            }
+        if (const std::optional<E> value = FindWord(word, table)) {
+            *out = *value;
+            return S_OK;
         }
         return FailWith(E_FAIL, unknownFormat, word, where);
     }

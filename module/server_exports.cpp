@@ -6,22 +6,8 @@
 #include "module/class_objects.h"
 #include "module/class_table.h"
 #include "module/server_registration.h"
+#include "tav/guarded.h"
 
-namespace {
-
-// No exception may leave an exported function.
-template <typename Body>
-HRESULT Guarded(Body&& body) noexcept {
-    try {
-        return body();
-    } catch (const std::bad_alloc&) {
-        return E_OUTOFMEMORY;
-    } catch (...) {
-        return E_UNEXPECTED;
-    }
-}
-
-}  // namespace
 
 STDAPI DllGetClassObject(REFCLSID clsid, REFIID riid, LPVOID* object) {
     if (object == nullptr) {
@@ -32,15 +18,15 @@ STDAPI DllGetClassObject(REFCLSID clsid, REFIID riid, LPVOID* object) {
     if (row == nullptr) {
         return CLASS_E_CLASSNOTAVAILABLE;
     }
-    return Guarded([&] { return tav::GetClassObject(*row, riid, object); });
+    return tav::Guarded([&] { return tav::GetClassObject(*row, riid, object); });
 }
 
 STDAPI DllCanUnloadNow(void) { return tav::ModuleLock::Count() == 0 ? S_OK : S_FALSE; }
 
 STDAPI DllRegisterServer(void) {
-    return Guarded([] { return tav::RegisterServer(tav::RequestedRegistrationScope()); });
+    return tav::Guarded([] { return tav::RegisterServer(tav::RequestedRegistrationScope()); });
 }
 
 STDAPI DllUnregisterServer(void) {
-    return Guarded([] { return tav::UnregisterServer(tav::RequestedRegistrationScope()); });
+    return tav::Guarded([] { return tav::UnregisterServer(tav::RequestedRegistrationScope()); });
 }

@@ -61,32 +61,29 @@ RegistrationScope RequestedRegistrationScope() {
     return PerUserRequested() ? RegistrationScope::User : RegistrationScope::Machine;
 }
 
-HRESULT RegisterServer(RegistrationScope scope) {
+namespace {
+
+// Every row runs the whole script, as each class registers itself; then the
+// type library follows.
+HRESULT RunRegistration(RegistrationScope scope, bool registering) {
     Registrar registrar(scope);
     OleString modulePath;
     std::string_view script;
     HRESULT hr = PrepareRegistrar(registrar, modulePath);
     if (SUCCEEDED(hr)) hr = LoadRegistryScript(script);
-    // Every row runs the whole script, as each class registers itself.
     for (size_t row = 0; row < ClassTable().size() && SUCCEEDED(hr); ++row) {
-        hr = registrar.Register(script);
+        hr = registering ? registrar.Register(script) : registrar.Unregister(script);
     }
-    if (SUCCEEDED(hr)) hr = RegisterTypeLibrary(modulePath, scope);
+    if (SUCCEEDED(hr)) {
+        hr = registering ? RegisterTypeLibrary(modulePath, scope) : UnregisterTypeLibrary(modulePath, scope);
+    }
     return hr;
 }
 
-HRESULT UnregisterServer(RegistrationScope scope) {
-    Registrar registrar(scope);
-    OleString modulePath;
-    std::string_view script;
-    HRESULT hr = PrepareRegistrar(registrar, modulePath);
-    if (SUCCEEDED(hr)) hr = LoadRegistryScript(script);
-    // Every row runs the whole script, as each class registers itself.
-    for (size_t row = 0; row < ClassTable().size() && SUCCEEDED(hr); ++row) {
-        hr = registrar.Unregister(script);
-    }
-    if (SUCCEEDED(hr)) hr = UnregisterTypeLibrary(modulePath, scope);
-    return hr;
-}
+}  // namespace
+
+HRESULT RegisterServer(RegistrationScope scope) { return RunRegistration(scope, true); }
+
+HRESULT UnregisterServer(RegistrationScope scope) { return RunRegistration(scope, false); }
 
 }  // namespace tav

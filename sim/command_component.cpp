@@ -4,7 +4,7 @@
 
 #include "sim/command_runner.h"
 #include "sim/controller_registry.h"
-#include "sim/guarded.h"
+#include "tav/guarded.h"
 #include "sim/status_codes.h"
 #include "tav/variant.h"
 
@@ -117,12 +117,7 @@ HRESULT CommandComponent::QueryInterface(REFIID riid, void** object) {
     return S_OK;
 }
 
-HRESULT CommandComponent::Fail(HRESULT hr, Text text) {
-    text = ErrorText(text);
-    std::lock_guard lock(mutex_);
-    lastError_ = std::move(text);
-    return hr;
-}
+HRESULT CommandComponent::Fail(HRESULT hr, Text text) { return lastError_.Record(hr, text); }
 
 HRESULT CommandComponent::NotProvided(TextView operation) {
     return Fail(E_NOTIMPL, Text(kComponent) + Text(operation) + OLESTR(": not provided by the virtual controller"));
@@ -351,18 +346,7 @@ HRESULT CommandComponent::CheckLink(TavInParams* rip, TavCommandReply* reply) {
     });
 }
 
-HRESULT CommandComponent::GetLastErrorInfo(BSTR* errorText) {
-    if (errorText == nullptr) {
-        return E_POINTER;
-    }
-    std::lock_guard lock(mutex_);
-    *errorText = nullptr;
-    if (lastError_.empty()) {
-        return S_OK;
-    }
-    *errorText = SysAllocStringLen(lastError_.data(), static_cast<UINT>(lastError_.size()));
-    return *errorText == nullptr ? E_OUTOFMEMORY : S_OK;
-}
+HRESULT CommandComponent::GetLastErrorInfo(BSTR* errorText) { return lastError_.CopyTo(errorText); }
 
 HRESULT CommandComponent::BindController(BSTR url) {
     return Guarded([&] {

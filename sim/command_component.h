@@ -1,4 +1,5 @@
 #pragma once
+#include "sim/last_error.h"
 #include <memory>
 #include <mutex>
 
@@ -79,7 +80,7 @@ private:
 
     ObjectLifetime lifetime_;
     std::mutex mutex_;
-    Text lastError_;
+    LastError lastError_;
     std::shared_ptr<ControllerModel> bound_;
     std::uint32_t clientId_ = 0;
     std::shared_ptr<SubscriptionHub> hub_;

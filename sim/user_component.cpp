@@ -2,7 +2,7 @@
 
 #include "sim/controller_binding.h"
 #include "sim/controller_registry.h"
-#include "sim/guarded.h"
+#include "tav/guarded.h"
 
 namespace tav::sim {
 namespace {
@@ -43,12 +43,7 @@ HRESULT UserComponent::QueryInterface(REFIID riid, void** object) {
     return S_OK;
 }
 
-HRESULT UserComponent::Fail(HRESULT hr, Text text) {
-    text = ErrorText(text);
-    std::lock_guard lock(mutex_);
-    lastError_ = std::move(text);
-    return hr;
-}
+HRESULT UserComponent::Fail(HRESULT hr, Text text) { return lastError_.Record(hr, text); }
 
 HRESULT UserComponent::NotProvided(TextView operation) {
     return Guarded([&] {
@@ -129,17 +124,6 @@ HRESULT UserComponent::UnpackCurrentMaster(VARIANT*, ULONG, TavMastershipStatus*
     return NotProvided(OLESTR("UnpackCurrentMaster"));
 }
 
-HRESULT UserComponent::GetLastErrorInfo(BSTR* errorText) {
-    if (errorText == nullptr) {
-        return E_POINTER;
-    }
-    std::lock_guard lock(mutex_);
-    *errorText = nullptr;
-    if (lastError_.empty()) {
-        return S_OK;
-    }
-    *errorText = SysAllocStringLen(lastError_.data(), static_cast<UINT>(lastError_.size()));
-    return *errorText == nullptr ? E_OUTOFMEMORY : S_OK;
-}
+HRESULT UserComponent::GetLastErrorInfo(BSTR* errorText) { return lastError_.CopyTo(errorText); }
 
 }  // namespace tav::sim

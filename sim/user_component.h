@@ -3,6 +3,7 @@
 
 #include "TavSiblings.h"
 #include "sim/com_object.h"
+#include "sim/last_error.h"
 #include "sim/text.h"
 #include "tav/com_ptr.h"
 
@@ -71,7 +72,7 @@ private:
 
     ObjectLifetime lifetime_;
     std::mutex mutex_;
-    Text lastError_;
+    LastError lastError_;
     Text url_;
     ComPtr<IUnknown> commandComponent_;
 };

@@ -64,7 +64,7 @@ private:
     std::size_t total_ = 0;
 };
 
-struct Spec {
+struct Conversion {
     bool left = false;
     bool zero = false;
     bool plus = false;
@@ -87,8 +87,8 @@ std::size_t ReadCount(const OLECHAR*& f, const OLECHAR* last) noexcept {
 
 // Reads "[flags][width][.precision][l|ll]conversion" from just after the '%';
 // conversion 0 when the format ends first.
-Spec ParseSpec(const OLECHAR*& f, const OLECHAR* last) noexcept {
-    Spec s;
+Conversion ParseConversion(const OLECHAR*& f, const OLECHAR* last) noexcept {
+    Conversion s;
     for (; f != last; ++f) {
         if (*f == u'-') {
             s.left = true;
@@ -123,13 +123,13 @@ Spec ParseSpec(const OLECHAR*& f, const OLECHAR* last) noexcept {
     return s;
 }
 
-void Pad(Sink& sink, std::size_t used, const Spec& s, bool beforeText) {
+void Pad(Sink& sink, std::size_t used, const Conversion& s, bool beforeText) {
     if (s.width > used && s.left != beforeText) {
         sink.Repeat(u' ', s.width - used);
     }
 }
 
-void WriteInteger(Sink& sink, const Spec& s, std::uint64_t bits) {
+void WriteInteger(Sink& sink, const Conversion& s, std::uint64_t bits) {
     const bool isSigned = s.conversion == u'd' || s.conversion == u'i';
     const bool hex = s.conversion == u'x' || s.conversion == u'X';
     bool negative = false;
@@ -205,7 +205,7 @@ std::size_t Utf8Units(std::string_view text, std::size_t maxUnits) {
     return units;
 }
 
-void WriteText(Sink& sink, const Spec& s, const FormatArg& arg) {
+void WriteText(Sink& sink, const Conversion& s, const FormatArg& arg) {
     static constexpr OLECHAR kNull[] = {u'(', u'n', u'u', u'l', u'l', u')'};
     const std::size_t maxUnits = s.hasPrecision ? s.precision : static_cast<std::size_t>(-1);
     if (arg.kind == FormatArgKind::Utf8Text) {
@@ -248,7 +248,7 @@ void Run(Sink& sink, OleStringView format, std::span<const FormatArg> args) {
             break;
         }
         const OLECHAR* const directive = f++;
-        const Spec s = ParseSpec(f, last);
+        const Conversion s = ParseConversion(f, last);
         const bool integer = s.conversion == u'd' || s.conversion == u'i' || s.conversion == u'u' ||
                              s.conversion == u'x' || s.conversion == u'X' || s.conversion == u'c';
         if (s.conversion == u'%') {

@@ -1,9 +1,5 @@
-// What the panel decoders share: the reply as the controller's C text, and
-// word tables that the caller walks in pieces.
+// What the panel decoders share: the reply as the controller's C text.
 #pragma once
-#include <initializer_list>
-#include <optional>
-
 #include "core/reply.h"
 #include "core/text/ole_string.h"
 
@@ -16,15 +12,6 @@ inline OleStringView ReplyText(const Reply& reply) {
     return text.substr(0, text.find(OLECHAR(0)));
 }
 
-// The value of word in table (exact, case-sensitive, first match wins).
-template <class E>
-std::optional<E> FindWord(OleStringView word, std::initializer_list<WordValue<E>> table) {
-    for (const auto& entry : table) {
-        if (IsWord(word, entry.word)) {
-            return entry.value;
-        }
-    }
-    return std::nullopt;
-}
+using tav::FindWord;
 
 }  // namespace tav::panel
