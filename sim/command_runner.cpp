@@ -1,11 +1,13 @@
 #include "sim/command_runner.h"
 
 #include "sim/status_codes.h"
+#include "sim/trace.h"
 
 namespace tav::sim {
 
-std::optional<Reply> RunCommand(ControllerModel& controller, const Command& command, ULONG timeOut,
-                                const Waiter& wait) {
+namespace {
+
+std::optional<Reply> Carry(ControllerModel& controller, const Command& command, ULONG timeOut, const Waiter& wait) {
     const std::chrono::milliseconds delay = controller.Faults().DelayFor(command.name);
     const std::chrono::milliseconds limit(timeOut);
     if (timeOut != 0 && delay > limit) {
@@ -22,6 +24,30 @@ std::optional<Reply> RunCommand(ControllerModel& controller, const Command& comm
         return Refuse(failure->status, std::move(failure->text));
     }
     return Dispatch(controller, command);
+}
+
+}  // namespace
+
+std::optional<Reply> RunCommand(ControllerModel& controller, const Command& command, ULONG timeOut,
+                                const Waiter& wait) {
+    if (!Tracing()) {
+        return Carry(controller, command, timeOut, wait);
+    }
+    const auto started = std::chrono::steady_clock::now();
+    std::optional<Reply> reply = Carry(controller, command, timeOut, wait);
+    if (reply) {
+        TraceRecord record;
+        record.url = command.url;
+        record.verb = command.verb;
+        record.command = command.name;
+        record.args = command.args;
+        record.status = reply->status;
+        record.hasText = reply->hasText;
+        record.text = reply->text;
+        record.took = std::chrono::steady_clock::now() - started;
+        Trace(record);
+    }
+    return reply;
 }
 
 }  // namespace tav::sim

@@ -83,4 +83,17 @@ private:
     T* object_ = nullptr;
 };
 
+// QueryInterface of object for I, by I's interface identifier: no cast at
+// the call site, so the identifier and the pointer type cannot disagree.
+template <typename I> HRESULT QueryTo(IUnknown* object, I** target) noexcept {
+    if (target == nullptr) return E_POINTER;
+    *target = nullptr;
+    if (object == nullptr) return E_POINTER;
+    return object->QueryInterface(__uuidof(I), reinterpret_cast<void**>(target));
+}
+
+template <typename I> HRESULT QueryTo(IUnknown* object, ComPtr<I>& target) noexcept {
+    return QueryTo(object, &target);
+}
+
 }  // namespace tav
