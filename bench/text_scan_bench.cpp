@@ -1,18 +1,21 @@
-// Scan against the C library's sscanf on the reply formats of the system,
-// both on the same ASCII text in the same process. Each format runs twice,
-// as "Scan/<name>" and "sscanf/<name>"; the table printed at the end gives
-// the time of Scan as a share of the time of sscanf.
+// Scan against the C library's sscanf on the reply grammars of the system,
+// both on the same ASCII text in the same process. Each grammar runs three
+// ways: "Scan/<name>" with the format compiled (as the decoders use it),
+// "ScanRuntime/<name>" with the format read at run time, and
+// "sscanf/<name>". The table printed at the end gives each Scan's time as a
+// share of sscanf's, from the medians when there are repetitions.
 #include <benchmark/benchmark.h>
 
 #include <cmath>
 #include <cstdint>
 #include <cstdio>
 #include <iostream>
-#include <map>
 #include <string>
+#include <vector>
 
 #include "core/text/convert.h"
 #include "core/text/scan.h"
+#include "median_reporter.h"
 
 namespace {
 
@@ -20,19 +23,32 @@ using tav::OleString;
 using tav::OleStringView;
 using tav::text::Scan;
 
-// Registers one format: ours reads OLECHAR text, theirs the same text in
-// ASCII. Each returns the number of fields, checked once before timing.
-template <typename Ours, typename Theirs>
-void Register(const std::string& name, const char* format, const char* input, Ours ours, Theirs theirs) {
+std::vector<std::string>& Names() {
+    static std::vector<std::string> names;
+    return names;
+}
+
+// Registers one grammar: the compiled and the run-time Scan read OLECHAR
+// text, sscanf the same text in ASCII. Each returns the number of fields;
+// all three must agree before anything is timed.
+template <typename Compiled, typename Runtime, typename Theirs>
+void Register(const std::string& name, const char* format, const char* input, Compiled compiled, Runtime runtime,
+              Theirs theirs) {
     const OleString wideFormat = tav::text::Widen(format);
     const OleString wideInput = tav::text::Widen(input);
     const int expected = theirs(input, format);
+    Names().push_back(name);
     benchmark::RegisterBenchmark(("Scan/" + name).c_str(), [=](benchmark::State& state) {
-        if (ours(wideInput, wideFormat) != expected) {
+        if (compiled(wideInput) != expected || runtime(wideInput, wideFormat) != expected) {
             state.SkipWithError("Scan and sscanf disagree");
         }
         for (auto _ : state) {
-            benchmark::DoNotOptimize(ours(wideInput, wideFormat));
+            benchmark::DoNotOptimize(compiled(wideInput));
+        }
+    });
+    benchmark::RegisterBenchmark(("ScanRuntime/" + name).c_str(), [=](benchmark::State& state) {
+        for (auto _ : state) {
+            benchmark::DoNotOptimize(runtime(wideInput, wideFormat));
         }
     });
     benchmark::RegisterBenchmark(("sscanf/" + name).c_str(), [=](benchmark::State& state) {
@@ -42,216 +58,109 @@ void Register(const std::string& name, const char* format, const char* input, Ou
     });
 }
 
-void RegisterReplyFormats() {
-    Register(
-        "time_t", "-time_t %lu", "-time_t 1700000000",
-        [](OleStringView in, OleStringView f) {
-            std::uint32_t v;
-            const int r = Scan(in, f, &v);
-            benchmark::DoNotOptimize(v);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            unsigned long v;
-            const int r = std::sscanf(in, f, &v);
-            benchmark::DoNotOptimize(v);
-            return r;
-        });
-    Register(
-        "quoted_name", "-Name \"%256[^\"]", "-Name \"Robot cell 1 of the east wing\"",
-        [](OleStringView in, OleStringView f) {
-            OLECHAR name[257];
-            const int r = Scan(in, f, name);
-            benchmark::DoNotOptimize(name);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            char name[257];
-            const int r = std::sscanf(in, f, name);
-            benchmark::DoNotOptimize(name);
-            return r;
-        });
-    Register(
-        "auto_condition_head", "-auto_ch %d -noelts %d\t%n", "-auto_ch 1 -noelts 12\tMotorOn;1;100\t",
-        [](OleStringView in, OleStringView f) {
-            int a, b, n;
-            const int r = Scan(in, f, &a, &b, &n);
-            benchmark::DoNotOptimize(n);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            int a, b, n;
-            const int r = std::sscanf(in, f, &a, &b, &n);
-            benchmark::DoNotOptimize(n);
-            return r;
-        });
-    Register(
-        "auto_condition_element", "%10[^;];%d;%lu\t%n", "MotorOn;1;4294967295\tRunMode;0;1\t",
-        [](OleStringView in, OleStringView f) {
-            OLECHAR name[11];
-            int keep, n;
-            std::uint32_t value;
-            const int r = Scan(in, f, name, &keep, &value, &n);
-            benchmark::DoNotOptimize(n);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            char name[11];
-            int keep, n;
-            unsigned long value;
-            const int r = std::sscanf(in, f, name, &keep, &value, &n);
-            benchmark::DoNotOptimize(n);
-            return r;
-        });
-    Register(
-        "storage_device", "%30[^;];%20[^;];%d;%d\t%n", "HD0:/internal;flash disk;1;0\tUSB1;usb;0;1\t",
-        [](OleStringView in, OleStringView f) {
-            OLECHAR name[31], type[21];
-            int enabled, readOnly, n;
-            const int r = Scan(in, f, name, type, &enabled, &readOnly, &n);
-            benchmark::DoNotOptimize(n);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            char name[31], type[21];
-            int enabled, readOnly, n;
-            const int r = std::sscanf(in, f, name, type, &enabled, &readOnly, &n);
-            benchmark::DoNotOptimize(n);
-            return r;
-        });
-    Register(
-        "slot_head", "-noelts,all,mark,cc %ld,%ld,%lu,%lu\t%n", "-noelts,all,mark,cc 17,1,0,4294967295\tslot",
-        [](OleStringView in, OleStringView f) {
-            std::int32_t count, all;
-            std::uint32_t mark, cursor;
-            int n;
-            const int r = Scan(in, f, &count, &all, &mark, &cursor, &n);
-            benchmark::DoNotOptimize(n);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            long count, all;
-            unsigned long mark, cursor;
-            int n;
-            const int r = std::sscanf(in, f, &count, &all, &mark, &cursor, &n);
-            benchmark::DoNotOptimize(n);
-            return r;
-        });
-    Register(
-        "number_array_element", "%lf,%n", "-1234.5625e-3,17.25,",
-        [](OleStringView in, OleStringView f) {
-            double v;
-            int n;
-            const int r = Scan(in, f, &v, &n);
-            benchmark::DoNotOptimize(v);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            double v;
-            int n;
-            const int r = std::sscanf(in, f, &v, &n);
-            benchmark::DoNotOptimize(v);
-            return r;
-        });
-    Register(
-        "flag_array_element", "%c%n", "1011",
-        [](OleStringView in, OleStringView f) {
-            OLECHAR c;
-            int n;
-            const int r = Scan(in, f, &c, &n);
-            benchmark::DoNotOptimize(c);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            char c;
-            int n;
-            const int r = std::sscanf(in, f, &c, &n);
-            benchmark::DoNotOptimize(c);
-            return r;
-        });
-    Register(
-        "ip_address", "%lu.%lu.%lu.%lu", "192.168.100.254",
-        [](OleStringView in, OleStringView f) {
-            std::uint32_t a, b, c, d;
-            const int r = Scan(in, f, &a, &b, &c, &d);
-            benchmark::DoNotOptimize(d);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            unsigned long a, b, c, d;
-            const int r = std::sscanf(in, f, &a, &b, &c, &d);
-            benchmark::DoNotOptimize(d);
-            return r;
-        });
-    Register(
-        "camera_info",
-        "-currIPAddress \"%40s -currSubnetMask \"%40s -currDefaultGateway \"%40s -currHostName \"%40s "
-        "-currIsDHCPEnabled %d -cameraName \"%40s -Status \"%20[^\"]",
-        "-currIPAddress \"192.168.1.20\" -currSubnetMask \"255.255.255.0\" -currDefaultGateway \"192.168.1.1\" "
-        "-currHostName \"cam-7\" -currIsDHCPEnabled 1 -cameraName \"Gripper camera\" -Status \"Running fine\"",
-        [](OleStringView in, OleStringView f) {
-            OLECHAR ip[41], mask[41], gateway[41], host[41], name[41], status[21];
-            int dhcp;
-            const int r = Scan(in, f, ip, mask, gateway, host, &dhcp, name, status);
-            benchmark::DoNotOptimize(status);
-            return r;
-        },
-        [](const char* in, const char* f) {
-            char ip[41], mask[41], gateway[41], host[41], name[41], status[21];
-            int dhcp;
-            const int r = std::sscanf(in, f, ip, mask, gateway, host, &dhcp, name, status);
-            benchmark::DoNotOptimize(status);
-            return r;
-        });
+// Makes every target's contents observable, so that no store is elided.
+template <typename... Targets>
+void Keep(Targets&&... targets) {
+    (benchmark::DoNotOptimize(targets), ...);
 }
 
-// The usual console output, then Scan's time as a share of sscanf's.
-class RatioReporter : public benchmark::ConsoleReporter {
-public:
-    void ReportRuns(const std::vector<Run>& runs) override {
-        ConsoleReporter::ReportRuns(runs);
-        for (const Run& run : runs) {
-            if (run.run_type != Run::RT_Iteration || run.error_occurred) {
-                continue;
-            }
-            const std::string name = run.benchmark_name();
-            const auto slash = name.find('/');
-            Timing& timing = timings_[name.substr(slash + 1)];
-            (name.compare(0, slash, "Scan") == 0 ? timing.ours : timing.theirs) = run.GetAdjustedCPUTime();
-        }
-    }
+// One grammar's three ways from one list of targets, declared once.
+#define TAV_SCAN_GRAMMAR(name, format, input, OURS, THEIRS, ...)                       \
+    Register(                                                                          \
+        name, format, input,                                                           \
+        [](OleStringView in) {                                                         \
+            OURS;                                                                      \
+            const int r = Scan<OLESTR(format)>(in, __VA_ARGS__);                       \
+            Keep(__VA_ARGS__);                                                         \
+            return r;                                                                  \
+        },                                                                             \
+        [](OleStringView in, OleStringView f) {                                        \
+            OURS;                                                                      \
+            const int r = Scan(in, f, __VA_ARGS__);                                    \
+            Keep(__VA_ARGS__);                                                         \
+            return r;                                                                  \
+        },                                                                             \
+        [](const char* in, const char* f) {                                            \
+            THEIRS;                                                                    \
+            const int r = std::sscanf(in, f, __VA_ARGS__);                             \
+            Keep(__VA_ARGS__);                                                         \
+            return r;                                                                  \
+        })
 
-    void Finalize() override {
-        ConsoleReporter::Finalize();
-        std::ostream& out = GetOutputStream();
-        out << "\nScan time / sscanf time, same text, same process:\n";
-        double logSum = 0;
-        int count = 0;
-        for (const auto& [name, timing] : timings_) {
-            if (timing.ours <= 0 || timing.theirs <= 0) {
-                continue;
-            }
-            const double ratio = timing.ours / timing.theirs;
-            char line[128];
-            std::snprintf(line, sizeof line, "  %-24s %6.3f\n", name.c_str(), ratio);
-            out << line;
-            logSum += std::log(ratio);
-            ++count;
-        }
-        if (count > 0) {
-            char line[128];
-            std::snprintf(line, sizeof line, "  %-24s %6.3f\n", "geometric mean", std::exp(logSum / count));
-            out << line;
-        }
-    }
+void RegisterReplyGrammars() {
+    TAV_SCAN_GRAMMAR("time_t", "-time_t %lu", "-time_t 1700000000", std::uint32_t v, unsigned long v, &v);
+    TAV_SCAN_GRAMMAR("quoted_name", "-Name \"%256[^\"]", "-Name \"Robot cell 1 of the east wing\"",
+                     OLECHAR name[257], char name[257], name);
+    TAV_SCAN_GRAMMAR("auto_condition_head", "-auto_ch %d -noelts %d\t%n", "-auto_ch 1 -noelts 12\tMotorOn;1;100\t",
+                     int a; int b; int n, int a; int b; int n, &a, &b, &n);
+    TAV_SCAN_GRAMMAR("auto_condition_element", "%10[^;];%d;%lu\t%n", "MotorOn;1;4294967295\tRunMode;0;1\t",
+                     OLECHAR name[11]; int keep; std::uint32_t value; int n,
+                     char name[11]; int keep; unsigned long value; int n, name, &keep, &value, &n);
+    TAV_SCAN_GRAMMAR("storage_device", "%30[^;];%20[^;];%d;%d\t%n", "HD0:/internal;flash disk;1;0\tUSB1;usb;0;1\t",
+                     OLECHAR name[31]; OLECHAR type[21]; int enabled; int readOnly; int n,
+                     char name[31]; char type[21]; int enabled; int readOnly; int n, name, type, &enabled,
+                     &readOnly, &n);
+    TAV_SCAN_GRAMMAR("slot_head", "-noelts,all,mark,cc %ld,%ld,%lu,%lu\t%n",
+                     "-noelts,all,mark,cc 17,1,0,4294967295\tslot",
+                     std::int32_t count; std::int32_t all; std::uint32_t mark; std::uint32_t cursor; int n,
+                     long count; long all; unsigned long mark; unsigned long cursor; int n, &count, &all, &mark,
+                     &cursor, &n);
+    TAV_SCAN_GRAMMAR("number_array_element", "%lf,%n", "-1234.5625e-3,17.25,", double v; int n, double v; int n,
+                     &v, &n);
+    TAV_SCAN_GRAMMAR("flag_array_element", "%c%n", "1011", OLECHAR c; int n, char c; int n, &c, &n);
+    TAV_SCAN_GRAMMAR("ip_address", "%lu.%lu.%lu.%lu", "192.168.100.254",
+                     std::uint32_t a; std::uint32_t b; std::uint32_t c; std::uint32_t d,
+                     unsigned long a; unsigned long b; unsigned long c; unsigned long d, &a, &b, &c, &d);
+    TAV_SCAN_GRAMMAR(
+        "camera_info2",
+        "-currIPAddress \"%40s -currSubnetMask \"%40s -currDefaultGateway \"%40s -currHostName \"%40s "
+        "-currDNSServer\"%40s -currDNSSuffix \"%40s -currIsDHCPEnabled %d -confIPAddress \"%40s "
+        "-confSubnetMask \"%40s -confDefaultGateway \"%40s -confHostName \"%40s -confDNSServer \"%40s "
+        "-ConfDNSSuffix \"%40s -confIsDHCPEnabled %d -confCameraName \"%40s -cameraIdx %d -macAddress\"%40s  "
+        "-Status \"%20s  -username \"%40[^\"]",
+        "-currIPAddress \"192.168.1.20\" -currSubnetMask \"255.255.255.0\" -currDefaultGateway \"192.168.1.1\" "
+        "-currHostName \"cam-7\" -currDNSServer\"192.168.1.2\" -currDNSSuffix \"cell.local\" -currIsDHCPEnabled 0 "
+        "-confIPAddress \"192.168.1.20\" -confSubnetMask \"255.255.255.0\" -confDefaultGateway \"192.168.1.1\" "
+        "-confHostName \"cam-7\" -confDNSServer \"192.168.1.2\" -ConfDNSSuffix \"cell.local\" "
+        "-confIsDHCPEnabled 0 -confCameraName \"Gripper\" -cameraIdx 2 -macAddress\"00:1A:2B:3C:4D:5E\" "
+        "-Status \"Running\" -username \"operator\"",
+        OLECHAR f1[41]; OLECHAR f2[41]; OLECHAR f3[41]; OLECHAR f4[41]; OLECHAR f5[41]; OLECHAR f6[41]; int d1;
+        OLECHAR f7[41]; OLECHAR f8[41]; OLECHAR f9[41]; OLECHAR f10[41]; OLECHAR f11[41]; OLECHAR f12[41];
+        int d2; OLECHAR f13[41]; int idx; OLECHAR f14[41]; OLECHAR status[21]; OLECHAR user[41],
+        char f1[41]; char f2[41]; char f3[41]; char f4[41]; char f5[41]; char f6[41]; int d1; char f7[41];
+        char f8[41]; char f9[41]; char f10[41]; char f11[41]; char f12[41]; int d2; char f13[41]; int idx;
+        char f14[41]; char status[21]; char user[41],
+        f1, f2, f3, f4, f5, f6, &d1, f7, f8, f9, f10, f11, f12, &d2, f13, &idx, f14, status, user);
+}
 
-private:
-    struct Timing {
-        double ours = 0;
-        double theirs = 0;
-    };
-    std::map<std::string, Timing> timings_;
-};
+#undef TAV_SCAN_GRAMMAR
+
+void PrintRatios(tav::bench::MedianReporter& reporter, std::ostream& out) {
+    out << "\nScan time / sscanf time, same text, same process (compiled format; read at run time):\n";
+    double logCompiled = 0;
+    double logRuntime = 0;
+    int count = 0;
+    for (const std::string& name : Names()) {
+        const double compiled = reporter.Median("Scan/" + name);
+        const double runtime = reporter.Median("ScanRuntime/" + name);
+        const double theirs = reporter.Median("sscanf/" + name);
+        if (compiled <= 0 || runtime <= 0 || theirs <= 0) {
+            continue;
+        }
+        char line[160];
+        std::snprintf(line, sizeof line, "  %-24s %6.3f  %6.3f\n", name.c_str(), compiled / theirs, runtime / theirs);
+        out << line;
+        logCompiled += std::log(compiled / theirs);
+        logRuntime += std::log(runtime / theirs);
+        ++count;
+    }
+    if (count > 0) {
+        char line[160];
+        std::snprintf(line, sizeof line, "  %-24s %6.3f  %6.3f\n", "geometric mean", std::exp(logCompiled / count),
+                      std::exp(logRuntime / count));
+        out << line;
+    }
+}
 
 }  // namespace
 
@@ -260,9 +169,10 @@ int main(int argc, char** argv) {
     if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
         return 1;
     }
-    RegisterReplyFormats();
-    RatioReporter reporter;
+    RegisterReplyGrammars();
+    tav::bench::MedianReporter reporter;
     benchmark::RunSpecifiedBenchmarks(&reporter);
+    PrintRatios(reporter, std::cout);
     benchmark::Shutdown();
     return 0;
 }

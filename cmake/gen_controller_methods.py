@@ -6,7 +6,13 @@ C++ declarations of the controller interfaces into X-macro lines, so that the
 controller class declares its overrides without restating a signature, and
 emits an E_NOTIMPL body for every operation that no source file defines yet.
 
-usage: gen_controller_methods.py HEADER OUT_DIR STAMP INTERFACE... -- SOURCE...
+The operations that the controller object hands slot for slot to a sibling
+component (--forward INTERFACE=ACCESSOR: that interface and its bases, to the
+component interface the object's ACCESSOR() returns) get generated bodies in
+forwarded_operations.cpp: the initialised check, the call with the
+arguments unchanged, the component's error adopted on failure.
+
+usage: gen_controller_methods.py HEADER OUT_DIR STAMP [--forward I=ACCESSOR]... INTERFACE... -- SOURCE...
 """
 import re
 import sys
@@ -29,7 +35,19 @@ def parameters(text):
 
 def main(argv):
     sep = argv.index('--')
-    header, out_dir, stamp, wanted = Path(argv[1]), Path(argv[2]), Path(argv[3]), argv[4:sep]
+    header, out_dir, stamp = Path(argv[1]), Path(argv[2]), Path(argv[3])
+    rest = argv[4:sep]
+    forwards = {}
+    wanted = []
+    i = 0
+    while i < len(rest):
+        if rest[i] == '--forward':
+            iface, accessor = rest[i + 1].split('=')
+            forwards[iface] = accessor
+            i += 2
+        else:
+            wanted.append(rest[i])
+            i += 1
     sources = argv[sep + 1:]
     text = header.read_text()
     interfaces = {}
@@ -43,7 +61,21 @@ def main(argv):
     for src in sources:
         defined.update(DEFINED_RE.findall(Path(src).read_text(errors='replace')))
 
-    lines, pending, seen = [], [], {}
+    # Each forwarded interface with its bases, up to IUnknown.
+    forwarded = {}  # method -> (component interface, accessor)
+    for iface, accessor in forwards.items():
+        chain, current = [], iface
+        while current in interfaces:
+            chain.append(current)
+            current = interfaces[current][0]
+        for member in chain:
+            for method, _ in interfaces[member][1]:
+                forwarded[method] = (iface, accessor)
+    clash = sorted(defined & set(forwarded))
+    if clash:
+        sys.exit(f'forwarded operations also defined by hand: {clash}')
+
+    lines, pending, forwarding, seen = [], [], [], {}
     for iface in wanted:
         for method, raw in interfaces[iface][1]:
             params, names = parameters(raw)
@@ -55,15 +87,33 @@ def main(argv):
             seen[method] = signature
             entry = f'TAV_CONTROLLER_METHOD({iface}, {method}, {signature}, ({", ".join(names)}))'
             lines.append(entry)
-            if method not in defined:
+            if method in forwarded:
+                component, accessor = forwarded[method]
+                forwarding.append(forward_body(method, signature, names, component, accessor))
+            elif method not in defined:
                 pending.append(entry)
 
     out_dir.mkdir(parents=True, exist_ok=True)
     banner = '// Generated from the widl header by gen_controller_methods.py. Do not edit.\n'
     write(out_dir / 'controller_methods.inc', banner + '\n'.join(lines) + '\n')
     write(out_dir / 'pending_operations.inc', banner + '\n'.join(pending) + '\n')
+    write(out_dir / 'forwarded_operations.cpp',
+          banner + '#include "core/controller_object.h"\n\nnamespace tav {\n\n' + '\n'.join(forwarding) +
+          '\n}  // namespace tav\n')
     stamp.touch()
-    print(f'controller operations: {len(lines)}, not yet implemented: {len(pending)}')
+    print(f'controller operations: {len(lines)}, forwarded: {len(forwarding)}, '
+          f'not yet implemented: {len(pending)}')
+
+
+def forward_body(method, signature, names, component, accessor):
+    # Each failure on a line of its own: the error suffix tells them apart.
+    args = ''.join(f', {n}' for n in names)
+    return (f'HRESULT STDMETHODCALLTYPE ControllerObject::{method}{signature} {{\n'
+            f'    return Forward({accessor}(),\n'
+            f'                   ErrorSite::Here(),  // used before Init\n'
+            f'                   ErrorSite::Here(),  // the component failed\n'
+            f'                   &{component}::{method}{args});\n'
+            f'}}\n')
 
 
 def write(path, content):

@@ -4,11 +4,6 @@
 #include "tav/bstr.h"
 
 namespace tav {
-namespace {
-
-ErrorSite SiteOf(const Where& where) { return ErrorSite{static_cast<int>(where.line())}; }
-
-}  // namespace
 
 bool ValidInParams(const TavInParams* rip) {
     return rip == nullptr || rip->pCallback == nullptr ||
@@ -47,7 +42,7 @@ Call::Call(ControllerObject& object, TavInParams* rip) : object_(object), rip_(r
 Call& Call::ValidParams(const OLECHAR* text, Where where) {
     if (!failed() && !ValidInParams(rip_)) {
         // The callback is not to be trusted, so it is not told.
-        hr_ = object_.Errors().Set(E_INVALIDARG, SiteOf(where), text);
+        hr_ = object_.Errors().Set(E_INVALIDARG, ErrorSite::From(where), ViewOf(text));
     }
     return *this;
 }
@@ -58,13 +53,25 @@ Call& Call::Initialised(const OLECHAR* text, Where where) {
 
 Call& Call::Require(bool ok, HRESULT hr, const OLECHAR* text, Where where) {
     if (!failed() && !ok) {
-        Fail(hr, text, where);
+        Fail(hr, ViewOf(text), where);
+    }
+    return *this;
+}
+
+Call& Call::RetrievalParams(const TavRetrievalParams* params, LONG retrieveAll, const OLECHAR* nullText,
+                            const OLECHAR* modeText, Where where) {
+    if (!failed()) {
+        if (params == nullptr) {
+            Fail(E_INVALIDARG, ViewOf(nullText), where);
+        } else if (params->noOfElts != retrieveAll) {
+            Fail(E_INVALIDARG, ViewOf(modeText));
+        }
     }
     return *this;
 }
 
 HRESULT Call::Fail(HRESULT hr, OleStringView text, Where where) {
-    hr_ = object_.Errors().Set(hr, SiteOf(where), text);
+    hr_ = object_.Errors().Set(hr, ErrorSite::From(where), text);
     return NotifyCallback(object_, rip_, hr_);
 }
 
@@ -95,13 +102,35 @@ SentCommand Call::SendTo(BSTR url, Verb verb, OleStringView command, OleStringVi
         return sent;
     }
     ITavComCtrl* component = object_.CommandComponent();
-    const HRESULT hr = component->Execute(rip_, &sent.reply_.Record(), verbText.Get(), url, commandText.Get(),
-                                          argsText.Get());
+    sent.hr_ = Delivered(component->Execute(rip_, &sent.reply_.Record(), verbText.Get(), url, commandText.Get(),
+                                            argsText.Get()),
+                         component, where);
+    return sent;
+}
+
+HRESULT Call::SendMessage(TavIPCHeaderInternal* header, byte* data, LONG size, Where where) {
+    if (failed()) {
+        return hr_;
+    }
+    ITavComCtrl* component = object_.CommandComponent();
+    return Delivered(component->SendIPCMessage(rip_, header, data, size), component, where);
+}
+
+ComPtr<ITavFile> Call::FileInterface(const OLECHAR* noFileText) {
+    ComPtr<ITavFile> file;
+    if (FAILED(QueryTo(object_.CommandComponent(), file)) || !file) {
+        file = nullptr;
+        Fail(E_FAIL, ViewOf(noFileText));
+    }
+    return file;
+}
+
+HRESULT Call::Delivered(HRESULT hr, IUnknown* component, Where where) {
     if (FAILED(hr)) {
-        sent.hr_ = object_.Errors().AdoptFromComponent(hr, component, SiteOf(where));
+        object_.Errors().AdoptFromComponent(hr, component, ErrorSite::From(where));
         NotifyCallback(object_, rip_, hr);
     }
-    return sent;
+    return hr;
 }
 
 SentCommand::SentCommand(ControllerObject& object, TavInParams* rip, HRESULT hr)
@@ -118,7 +147,7 @@ bool SentCommand::Finished(HRESULT* result, Where where) {
         return true;
     }
     if (reply_.Record().status < 0) {
-        *result = object_.Errors().SetFromReply(reply_.Record(), SiteOf(where));
+        *result = object_.Errors().SetFromReply(reply_.Record(), ErrorSite::From(where));
         return true;
     }
     *result = S_OK;
@@ -129,6 +158,21 @@ HRESULT SentCommand::StatusOnly(Where where) {
     HRESULT result;
     Finished(&result, where);
     return result;
+}
+
+HRESULT SentCommand::TakeText(BSTR* out, const OLECHAR* notText, Where where) {
+    HRESULT result;
+    if (Finished(&result, where)) {
+        return result;
+    }
+    VARIANT& data = *reply_.Data();
+    if (data.vt != VT_BSTR) {
+        return object_.Errors().Set(E_FAIL, ErrorSite::Here(), ViewOf(notText));
+    }
+    *out = data.bstrVal;
+    data.vt = VT_EMPTY;
+    data.bstrVal = nullptr;
+    return S_OK;
 }
 
 }  // namespace tav

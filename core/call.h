@@ -4,7 +4,10 @@
 #include <utility>
 
 #include "TavController.h"
+#include "TavSiblings.h"
+#include "core/error_site.h"
 #include "core/text/ole_string.h"
+#include "tav/com_ptr.h"
 #include "tav/platform.h"
 
 namespace tav {
@@ -39,27 +42,31 @@ public:
     SentCommand(SentCommand&&) = default;
 
     // Operations without a reply value.
-    HRESULT StatusOnly(Where where = Where::current());
+    [[nodiscard]] HRESULT StatusOnly(Where where = Where::current());
     // Operations whose Sync reply is decoded by their Unpack operation; decode
     // is called with the reply VARIANT and must call that operation through the
     // object's interface so that an override is honoured.
     template <class F>
-    HRESULT Decode(F&& decode, Where where = Where::current()) {
+    [[nodiscard]] HRESULT Decode(F&& decode, Where where = Where::current()) {
         HRESULT result;
         if (Finished(&result, where)) {
             return result;
         }
         return std::forward<F>(decode)(reply_.Data());
     }
-    // The raw Sync reply, for the few operations that hand it on as it is.
+    // The raw Sync reply, for the few operations that read it themselves.
     template <class F>
-    HRESULT WithReply(F&& use, Where where = Where::current()) {
+    [[nodiscard]] HRESULT WithReply(F&& use, Where where = Where::current()) {
         HRESULT result;
         if (Finished(&result, where)) {
             return result;
         }
         return std::forward<F>(use)(reply_.Record());
     }
+    // Free text handed on as the controller wrote it: the Sync reply's own
+    // string becomes the caller's, without a copy. A reply that holds no
+    // string fails with E_FAIL and notText (reported from a line of its own).
+    [[nodiscard]] HRESULT TakeText(BSTR* out, const OLECHAR* notText, Where where = Where::current());
 
     CommandReply& Reply() { return reply_; }
     friend class Call;
@@ -81,33 +88,74 @@ enum class Verb { Get, Set };
 // initialised flag, the operation's own checks, then the send. Each step
 // records its own text with the line of the statement that states it, and
 // the steps after the TavInParams check also tell the caller's callback.
+// After the first failure every later step is skipped.
+//
+// A check that may only be evaluated once an earlier one has passed (a field
+// read through a pointer that an earlier step checks) is given as a callable,
+// which runs only while nothing has failed, or has a step of its own
+// (RetrievalParams); a plain bool is evaluated before the chain runs.
 class Call {
 public:
     Call(ControllerObject& object, TavInParams* rip);
 
     // Step 1: with a callback, riid must name ITavCommandCallback.
-    Call& ValidParams(const OLECHAR* text, Where where = Where::current());
+    [[nodiscard]] Call& ValidParams(const OLECHAR* text, Where where = Where::current());
     // Step 2.
     template <class T>
-    Call& OutPointer(T* out, const OLECHAR* text, Where where = Where::current()) {
+    [[nodiscard]] Call& OutPointer(T* out, const OLECHAR* text, Where where = Where::current()) {
         return Require(out != nullptr, E_POINTER, text, where);
     }
     // Step 3.
-    Call& Initialised(const OLECHAR* text, Where where = Where::current());
+    [[nodiscard]] Call& Initialised(const OLECHAR* text, Where where = Where::current());
     // Step 4: the operation's own checks.
-    Call& Require(bool ok, HRESULT hr, const OLECHAR* text, Where where = Where::current());
+    [[nodiscard]] Call& Require(bool ok, HRESULT hr, const OLECHAR* text, Where where = Where::current());
     template <class Check, class = std::enable_if_t<std::is_invocable_r_v<bool, Check>>>
-    Call& Require(Check&& check, HRESULT hr, const OLECHAR* text, Where where = Where::current()) {
+    [[nodiscard]] Call& Require(Check&& check, HRESULT hr, const OLECHAR* text, Where where = Where::current()) {
         return failed() ? *this : Require(std::forward<Check>(check)(), hr, text, where);
+    }
+    // The retrieval record of a list operation: present (else E_INVALIDARG
+    // with nullText), then asking for everything, which each list writes as
+    // its own number (else E_INVALIDARG with modeText, reported from a line
+    // of its own).
+    [[nodiscard]] Call& RetrievalParams(const TavRetrievalParams* params, LONG retrieveAll, const OLECHAR* nullText,
+                                        const OLECHAR* modeText, Where where = Where::current());
+    // A call into a sibling component as a step of its own (a file copied
+    // before the command that names it): on failure, its result with text.
+    template <class F, class = std::enable_if_t<std::is_invocable_r_v<HRESULT, F>>>
+    [[nodiscard]] Call& Invoke(F&& call, OleStringView text, Where where = Where::current()) {
+        if (!failed()) {
+            const HRESULT hr = std::forward<F>(call)();
+            if (FAILED(hr)) {
+                Fail(hr, text, where);
+            }
+        }
+        return *this;
     }
 
     // Steps 5 and 6: build the command and hand it to the command component.
-    SentCommand Get(OleStringView command, OleStringView args = {}, Where where = Where::current());
-    SentCommand Set(OleStringView command, OleStringView args = {}, Where where = Where::current());
-    SentCommand Send(Verb verb, OleStringView command, OleStringView args, Where where = Where::current());
+    [[nodiscard]] SentCommand Get(OleStringView command, OleStringView args = {}, Where where = Where::current());
+    [[nodiscard]] SentCommand Set(OleStringView command, OleStringView args = {}, Where where = Where::current());
+    [[nodiscard]] SentCommand Send(Verb verb, OleStringView command, OleStringView args,
+                                   Where where = Where::current());
     // The same, to a URL other than the stored one.
-    SentCommand SendTo(BSTR url, Verb verb, OleStringView command, OleStringView args,
-                       Where where = Where::current());
+    [[nodiscard]] SentCommand SendTo(BSTR url, Verb verb, OleStringView command, OleStringView args,
+                                     Where where = Where::current());
+    // The same steps through the command component's file interface:
+    // call(file, reply) makes the call; a failure takes over the file
+    // interface's error text, as a failed Execute does.
+    template <class F>
+    [[nodiscard]] SentCommand ThroughFile(F&& call, const OLECHAR* noFileText, Where where = Where::current()) {
+        SentCommand sent(object_, rip_, hr_);
+        if (!failed()) {
+            const ComPtr<ITavFile> file = FileInterface(noFileText);
+            sent.hr_ = file ? Delivered(std::forward<F>(call)(*file, sent.reply_.Record()), file.Get(), where) : hr_;
+        }
+        return sent;
+    }
+    // An IPC message handed to the command component, which carries it to
+    // the controller; its result, with the component's text on failure.
+    [[nodiscard]] HRESULT SendMessage(TavIPCHeaderInternal* header, byte* data, LONG size,
+                                      Where where = Where::current());
 
     bool failed() const { return FAILED(hr_); }
     HRESULT Result() const { return hr_; }
@@ -117,6 +165,14 @@ public:
     HRESULT Fail(HRESULT hr, OleStringView text, Where where = Where::current());
 
 private:
+    // The command component's file interface, asked for each time so that
+    // the call sees the component as it is now; null with the failure
+    // recorded (at a line of its own) when it has none.
+    ComPtr<ITavFile> FileInterface(const OLECHAR* noFileText);
+    // hr of a call into component: a failure takes over the component's
+    // error text and is told to the callback.
+    HRESULT Delivered(HRESULT hr, IUnknown* component, Where where);
+
     ControllerObject& object_;
     TavInParams* rip_;
     HRESULT hr_ = S_OK;

@@ -69,6 +69,30 @@ public:
     // Answers riid when the class version has it; otherwise E_NOINTERFACE.
     HRESULT FindInterface(REFIID riid, void** object);
 
+    // A command of the object's own (the IPC slots' queue reports and proxy
+    // control) through ITavCommand2: Sync, with an internal TavInParams and
+    // no callback, so no client is ever told of it. Its reply is not read;
+    // *result, when given, receives the component's 32-bit result. Records
+    // no error text; E_NOINTERFACE without ITavCommand2 (class versions
+    // below 8).
+    HRESULT InternalCommand(OleStringView command, OleStringView args, ULONG* result = nullptr);
+
+    // An operation handed slot for slot to a sibling component: the
+    // initialised check, the call with the arguments unchanged, the
+    // component's error text adopted on failure. The two sites tell the two
+    // failures apart.
+    template <class I, class Method, class... Args>
+    HRESULT Forward(I* component, ErrorSite beforeInit, ErrorSite failed, Method method, Args... args) {
+        if (!Initialised() || component == nullptr) {
+            return errors_.Set(E_ABORT, beforeInit, OLESTR("TavController used before Initialized"));
+        }
+        const HRESULT hr = (component->*method)(args...);
+        if (FAILED(hr)) {
+            errors_.AdoptFromComponent(hr, component, failed);
+        }
+        return hr;
+    }
+
 protected:
     // Objects are made by Create, as the interface-guarding subclass of
     // controller_interfaces.cpp, and destroyed by their last Release.

@@ -1,4 +1,5 @@
 #pragma once
+#include <cstdint>
 #include "TavController.h"
 #include "core/enumerator.h"
 #include "tav/platform.h"
@@ -20,6 +21,9 @@ inline void FreeString(BSTR& text) noexcept {
     SysFreeString(text);
     text = nullptr;
 }
+
+// Every traits class also gives kTargetSize, the element's size on the
+// 32-bit target, by which list sizes are counted.
 
 // Records of numbers only: copied as they are.
 template <class Record>
@@ -44,37 +48,44 @@ struct NamedRecordElements {
 };
 
 struct AutoConditionTraits : PlainRecordElements<TavAutoCondition> {
+    static constexpr size_t kTargetSize = 12;
     using Interface = IEnumAutoCondition;
     static const IID& Iid() noexcept { return IID_IEnumAutoCondition; }
 };
 
 struct AutoCondition2Traits : PlainRecordElements<TavAutoCondition2> {
+    static constexpr size_t kTargetSize = 8;
     using Interface = IEnumAutoCondition2;
     static const IID& Iid() noexcept { return IID_IEnumAutoCondition2; }
 };
 
 struct StorageDeviceTraits : NamedRecordElements<TavStorageDevice, &TavStorageDevice::deviceName> {
+    static constexpr size_t kTargetSize = 16;
     using Interface = IEnumStorageDevices;
     static const IID& Iid() noexcept { return IID_IEnumStorageDevices; }
 };
 
 struct StorageDevice2Traits : NamedRecordElements<TavStorageDevice2, &TavStorageDevice2::deviceName> {
+    static constexpr size_t kTargetSize = 20;
     using Interface = IEnumStorageDevices2;
     static const IID& Iid() noexcept { return IID_IEnumStorageDevices2; }
 };
 
 struct PscUnitTraits : PlainRecordElements<TavPSCUnit> {
+    static constexpr size_t kTargetSize = 12;
     using Interface = IEnumTavPSCUnits;
     static const IID& Iid() noexcept { return IID_IEnumTavPSCUnits; }
 };
 
 struct SlotTraits : NamedRecordElements<TavIPCSlot, &TavIPCSlot::slotName> {
+    static constexpr size_t kTargetSize = 16;
     using Interface = IEnumSlots;
     static const IID& Iid() noexcept { return IID_IEnumSlots; }
 };
 
 // The string enumerator, the only one that really sorts and filters.
 struct BstrTraits {
+    static constexpr size_t kTargetSize = 4;
     using Element = BSTR;
     using Interface = ITavEnumBSTR;
     static const IID& Iid() noexcept { return IID_ITavEnumBSTR; }
@@ -100,5 +111,15 @@ extern template class EnumeratorObject<StorageDevice2Traits>;
 extern template class EnumeratorObject<PscUnitTraits>;
 extern template class EnumeratorObject<SlotTraits>;
 extern template class EnumeratorObject<BstrTraits>;
+
+#if UINTPTR_MAX == 0xFFFFFFFFu
+static_assert(sizeof(TavAutoCondition) == AutoConditionTraits::kTargetSize);
+static_assert(sizeof(TavAutoCondition2) == AutoCondition2Traits::kTargetSize);
+static_assert(sizeof(TavStorageDevice) == StorageDeviceTraits::kTargetSize);
+static_assert(sizeof(TavStorageDevice2) == StorageDevice2Traits::kTargetSize);
+static_assert(sizeof(TavPSCUnit) == PscUnitTraits::kTargetSize);
+static_assert(sizeof(TavIPCSlot) == SlotTraits::kTargetSize);
+static_assert(sizeof(BSTR) == BstrTraits::kTargetSize);
+#endif
 
 }  // namespace tav

@@ -9,8 +9,12 @@ namespace tav {
 struct ErrorSite {
     int line;
 
-    static constexpr ErrorSite Here(std::source_location where = std::source_location::current()) {
+    // The one place where a source location becomes an error site.
+    static constexpr ErrorSite From(const std::source_location& where) {
         return ErrorSite{static_cast<int>(where.line())};
+    }
+    static constexpr ErrorSite Here(std::source_location where = std::source_location::current()) {
+        return From(where);
     }
 };
 

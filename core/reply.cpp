@@ -1,41 +1,29 @@
 #include "core/reply.h"
 
-#include <array>
-#include <span>
-
 #include "core/controller_object.h"
 #include "core/text/format.h"
-#include "core/text/scan.h"
 
 namespace tav {
-namespace {
-
-ErrorSite SiteOf(const std::source_location& where) { return ErrorSite{static_cast<int>(where.line())}; }
-
-// Room for the widest string field of any reply grammar.
-constexpr size_t kFieldRoom = 1024;
-
-}  // namespace
 
 Reply::Reply(ControllerObject& object, VARIANT* data) : object_(object), data_(data) {}
 
 Reply& Reply::Initialised(const OLECHAR* text, Where where) {
     if (!failed() && !object_.Initialised()) {
-        Fail(E_ABORT, text, where);
+        Fail(E_ABORT, ViewOf(text), where);
     }
     return *this;
 }
 
 Reply& Reply::NotNull(const OLECHAR* text, Where where) {
     if (!failed() && data_ == nullptr) {
-        Fail(E_INVALIDARG, text, where);
+        Fail(E_INVALIDARG, ViewOf(text), where);
     }
     return *this;
 }
 
 Reply& Reply::IsBstr(const OLECHAR* text, Where where) {
     if (!failed() && data_->vt != VT_BSTR) {
-        Fail(E_FAIL, text, where);
+        Fail(E_FAIL, ViewOf(text), where);
     }
     return *this;
 }
@@ -45,13 +33,25 @@ OleStringView Reply::Text() const {
     return text == nullptr ? OleStringView() : OleStringView(text, SysStringLen(text));
 }
 
-HRESULT Reply::Fail(HRESULT hr, OleStringView text, Where where) {
-    hr_ = object_.Errors().Set(hr, SiteOf(where), text);
+std::size_t Reply::Find(OleStringView key) const {
+    const OleStringView text = Text();
+    const std::size_t at = text.find(key);
+    // Only the text before a match needs to be searched for a NUL.
+    if (at == OleStringView::npos || text.substr(0, at).find(OLECHAR(0)) != OleStringView::npos) {
+        return OleStringView::npos;
+    }
+    return at;
+}
+
+HRESULT Reply::Fail(HRESULT hr, OleStringView text, Where where) { return Fail(hr, text, ErrorSite::From(where)); }
+
+HRESULT Reply::Fail(HRESULT hr, OleStringView text, ErrorSite site) {
+    hr_ = object_.Errors().Set(hr, site, text);
     return hr_;
 }
 
 HRESULT Reply::FailWith(HRESULT hr, OleStringView format, OleStringView value, Where where) {
-    return Fail(hr, text::Format(format, value), where);
+    return Fail(hr, text::Format(format, text::UpToNul(value)), where);
 }
 
 HRESULT Reply::Allocate(OleStringView text, BSTR* out, Where where) {
@@ -62,43 +62,27 @@ HRESULT Reply::Allocate(OleStringView text, BSTR* out, Where where) {
     return S_OK;
 }
 
-HRESULT Reply::QuotedString(OleStringView format, OleStringView emptyForm, BSTR* out, OleStringView failText,
-                            Where where) {
-    if (failed()) {
-        return hr_;
-    }
-    std::array<OLECHAR, kFieldRoom> field;
-    const OleStringView text = Text();
-    OleStringView value;
-    if (text::Scan(text, format, std::span<OLECHAR>(field)) == 1) {
-        value = OleStringView(field.data());
-    } else if (text.substr(0, emptyForm.size()) != emptyForm) {
-        return Fail(E_FAIL, failText, where);
-    }
-    return Allocate(value, out, where);
-}
-
-HRESULT Reply::WholeText(BSTR* out, OleStringView allocFailText, Where where) {
+HRESULT Reply::WholeText(BSTR* out, const OLECHAR* allocFailText, Where where) {
     if (failed()) {
         return hr_;
     }
     const BSTR source = data_->bstrVal;
     *out = source == nullptr ? nullptr : SysAllocStringLen(source, SysStringLen(source));
     if (source != nullptr && *out == nullptr) {
-        return Fail(E_OUTOFMEMORY, allocFailText, where);
+        return Fail(E_OUTOFMEMORY, ViewOf(allocFailText), where);
     }
     return S_OK;
 }
 
-HRESULT Reply::AfterPrefix(OleStringView prefix, BSTR* out, OleStringView failText, Where where) {
+HRESULT Reply::AfterPrefix(OleStringView prefix, BSTR* out, const OLECHAR* failText, Where where) {
     if (failed()) {
         return hr_;
     }
     const OleStringView text = Text();
     if (text.substr(0, prefix.size()) != prefix) {
-        return Fail(E_FAIL, failText, where);
+        return Fail(E_FAIL, ViewOf(failText), where);
     }
-    return Allocate(text.substr(prefix.size()), out, where);
+    return Allocate(text.substr(prefix.size()), out);
 }
 
 }  // namespace tav

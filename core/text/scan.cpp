@@ -8,13 +8,11 @@
 #include "core/text/char_class.h"
 #include "core/text/float_field.h"
 #include "core/text/number.h"
+#include "core/text/scan_cursor.h"
 #include "core/text/scan_set.h"
 
 namespace tav::text::detail {
 namespace {
-
-// A width this large never ends a field before the input does.
-constexpr std::size_t kUnboundedWidth = std::numeric_limits<std::size_t>::max() / 4;
 
 struct Directive {
     bool suppress = false;
@@ -138,12 +136,10 @@ void AssertTargetsMatch(const OLECHAR* f, const OLECHAR* last, std::span<const S
 }
 #endif
 
-enum class Step { Next, MatchingFailure, InputFailure };
-
 class Scanner {
 public:
     Scanner(OleStringView input, std::span<const ScanTarget> targets) noexcept
-        : begin_(input.data()), pos_(input.data()), end_(input.data() + input.size()), targets_(targets) {}
+        : cursor_(input.data(), input.data() + input.size()), targets_(targets) {}
 
     int Run(const OLECHAR* f, const OLECHAR* const last) noexcept {
         bool skipSpace = false;
@@ -155,16 +151,12 @@ public:
                     continue;
                 }
                 if (skipSpace) {
-                    SkipSpace();
+                    cursor_.SkipSpace();
                     skipSpace = false;
                 }
-                if (AtEnd()) {
-                    return InputFailure();
+                if (const int end = Finish(cursor_.Literal(fc)); end != kGoOn) {
+                    return end;
                 }
-                if (*pos_ != fc) {
-                    return stored_;
-                }
-                ++pos_;
                 continue;
             }
             const Directive d = ParseDirective(f, last);
@@ -172,39 +164,30 @@ public:
                 return stored_;
             }
             if (skipSpace || (d.conversion != u'[' && d.conversion != u'c' && d.conversion != u'n')) {
-                SkipSpace();
+                cursor_.SkipSpace();
                 skipSpace = false;
             }
-            switch (Convert(d)) {
-            case Step::Next:
-                break;
-            case Step::MatchingFailure:
-                return stored_;
-            case Step::InputFailure:
-                return InputFailure();
+            if (const int end = Finish(Convert(d)); end != kGoOn) {
+                return end;
             }
         }
         return stored_;
     }
 
 private:
-    int InputFailure() const noexcept { return stored_ == 0 ? kScanEof : stored_; }
+    static constexpr int kGoOn = -2;
 
-    // A NUL ends the input as it does in C. It is found where scanning
-    // reaches it rather than searched for up front, so that decoders which
-    // scan a long reply piece by piece do not read its rest each time.
-    bool AtEnd() const noexcept { return pos_ == end_ || *pos_ == 0; }
-
-    void SkipSpace() noexcept {
-        while (pos_ != end_ && IsSpace(*pos_)) {
-            ++pos_;
+    // The result of the whole scan when step ends it, else kGoOn.
+    int Finish(Step step) const noexcept {
+        switch (step) {
+        case Step::Next:
+            return kGoOn;
+        case Step::MatchingFailure:
+            return stored_;
+        case Step::InputFailure:
+            break;
         }
-    }
-
-    // The field may not go past the width nor past the input.
-    const OLECHAR* FieldEnd(std::size_t width) const noexcept {
-        const auto available = static_cast<std::size_t>(end_ - pos_);
-        return pos_ + (width == 0 ? available : std::min(width, available));
+        return stored_ == 0 ? kScanEof : stored_;
     }
 
     // Null target: the directive is suppressed. False: a programming error.
@@ -221,9 +204,11 @@ private:
         return true;
     }
 
-    Step Stored() noexcept {
-        ++stored_;
-        return Step::Next;
+    Step Counted(Step step, const ScanTarget* target) noexcept {
+        if (step == Step::Next && target != nullptr) {
+            ++stored_;
+        }
+        return step;
     }
 
     Step Convert(const Directive& d) noexcept {
@@ -231,135 +216,45 @@ private:
         if (!Take(d, target)) {
             return Step::MatchingFailure;
         }
+        void* const object = target != nullptr ? target->object : nullptr;
         switch (d.conversion) {
         case u'%':
-            if (AtEnd()) {
-                return Step::InputFailure;
-            }
-            if (*pos_ != u'%') {
-                return Step::MatchingFailure;
-            }
-            ++pos_;
-            return Step::Next;
+            return cursor_.Percent();
         case u'n':
-            if (target != nullptr) {
-                StoreInt32(*target, static_cast<std::uint32_t>(pos_ - begin_));
+            if (object != nullptr) {
+                const std::uint32_t consumed = cursor_.Consumed();
+                std::memcpy(object, &consumed, sizeof consumed);
             }
             return Step::Next;
         case u'c':
-            if (AtEnd()) {
-                return Step::InputFailure;
-            }
-            if (target == nullptr) {
-                ++pos_;
-                return Step::Next;
-            }
-            *static_cast<OLECHAR*>(target->object) = *pos_++;
-            return Stored();
+            return Counted(cursor_.Character(static_cast<OLECHAR*>(object)), target);
         case u'd':
-        case u'u':
-            return Integer(d, target);
+        case u'u': {
+            std::uint32_t bits = 0;
+            const Step step = cursor_.Integer(d.width, d.conversion == u'd', object != nullptr ? &bits : nullptr);
+            if (step == Step::Next && object != nullptr) {
+                std::memcpy(object, &bits, sizeof bits);
+            }
+            return Counted(step, target);
+        }
         case u's':
-            return Characters(d, target, [](OLECHAR c) { return !IsSpace(c); });
+            return Counted(cursor_.Characters(
+                               d.width, [](OLECHAR c) { return !IsSpace(c); }, static_cast<OLECHAR*>(object),
+                               target != nullptr ? target->capacity : 0),
+                           target);
         case u'[': {
             const ScanSet set(d.setMembers, d.setNegated);
-            return Characters(d, target, [&set](OLECHAR c) { return set.Accepts(c); });
+            return Counted(cursor_.Characters(
+                               d.width, [&set](OLECHAR c) { return set.Accepts(c); }, static_cast<OLECHAR*>(object),
+                               target != nullptr ? target->capacity : 0),
+                           target);
         }
         default:
-            return Float(d, target);
+            return Counted(cursor_.Float(d.width, static_cast<double*>(object)), target);
         }
     }
 
-    Step Integer(const Directive& d, const ScanTarget* target) noexcept {
-        if (AtEnd()) {
-            return Step::InputFailure;
-        }
-        const OLECHAR* const last = FieldEnd(d.width);
-        const OLECHAR* p = pos_;
-        bool negative = false;
-        if (*p == u'-' || *p == u'+') {
-            negative = *p == u'-';
-            ++p;
-        }
-        const Magnitude m = ReadDigits(p, last);
-        if (m.end == p) {
-            return Step::MatchingFailure;
-        }
-        pos_ = m.end;
-        if (target == nullptr) {
-            return Step::Next;
-        }
-        StoreInt32(*target, d.conversion == u'd' ? SignedLow32(negative, m) : UnsignedLow32(negative, m));
-        return Stored();
-    }
-
-    // strtol with a 64-bit long, then the int conversion's truncation.
-    static std::uint32_t SignedLow32(bool negative, const Magnitude& m) noexcept {
-        constexpr std::uint64_t kMaxPositive = std::numeric_limits<std::int64_t>::max();
-        const std::uint64_t limit = negative ? kMaxPositive + 1 : kMaxPositive;
-        const std::uint64_t magnitude = m.overflow ? limit : std::min(m.value, limit);
-        return static_cast<std::uint32_t>(negative ? 0 - magnitude : magnitude);
-    }
-
-    // strtoul with a 64-bit unsigned long, then the truncation.
-    static std::uint32_t UnsignedLow32(bool negative, const Magnitude& m) noexcept {
-        if (m.overflow) {
-            return std::numeric_limits<std::uint32_t>::max();
-        }
-        return static_cast<std::uint32_t>(negative ? 0 - m.value : m.value);
-    }
-
-    template <typename Accepts>
-    Step Characters(const Directive& d, const ScanTarget* target, Accepts accepts) noexcept {
-        if (AtEnd()) {
-            return Step::InputFailure;
-        }
-        const OLECHAR* const last = FieldEnd(d.width);
-        const OLECHAR* p = pos_;
-        while (p != last && *p != 0 && accepts(*p)) {
-            ++p;
-        }
-        const auto length = static_cast<std::size_t>(p - pos_);
-        if (length == 0) {
-            return Step::MatchingFailure;
-        }
-        if (target == nullptr) {
-            pos_ = p;
-            return Step::Next;
-        }
-        if (length >= target->capacity) {
-            return Step::MatchingFailure;
-        }
-        auto* out = static_cast<OLECHAR*>(target->object);
-        std::copy(pos_, p, out);
-        out[length] = 0;
-        pos_ = p;
-        return Stored();
-    }
-
-    Step Float(const Directive& d, const ScanTarget* target) noexcept {
-        if (AtEnd()) {
-            return Step::InputFailure;
-        }
-        const FloatField field = ReadFloatField(pos_, FieldEnd(d.width));
-        if (!field.matched) {
-            return Step::MatchingFailure;
-        }
-        pos_ += field.length;
-        if (target == nullptr) {
-            return Step::Next;
-        }
-        *static_cast<double*>(target->object) = field.value;
-        return Stored();
-    }
-
-    static void StoreInt32(const ScanTarget& target, std::uint32_t bits) noexcept {
-        std::memcpy(target.object, &bits, sizeof bits);
-    }
-
-    const OLECHAR* const begin_;
-    const OLECHAR* pos_;
-    const OLECHAR* const end_;
+    ScanCursor cursor_;
     const std::span<const ScanTarget> targets_;
     std::size_t next_ = 0;
     int stored_ = 0;

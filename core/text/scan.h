@@ -3,10 +3,12 @@
 #include <cstdint>
 #include <span>
 #include <string>
+#include <tuple>
 #include <type_traits>
 #include <utility>
 
 #include "core/text/ole_string.h"
+#include "core/text/scan_format.h"
 
 // Scanning of OLECHAR text with the conventions of sscanf, identical on every
 // platform because none of it is delegated to the C library.
@@ -59,16 +61,6 @@ template <typename>
 inline constexpr bool kNoScanTarget = false;
 
 template <typename T>
-inline constexpr bool kIsCharType = std::is_same_v<T, char> || std::is_same_v<T, signed char> ||
-                                    std::is_same_v<T, unsigned char> || std::is_same_v<T, wchar_t> ||
-                                    std::is_same_v<T, char8_t> || std::is_same_v<T, char16_t> ||
-                                    std::is_same_v<T, char32_t>;
-
-template <typename T>
-inline constexpr bool kIsInt32Target =
-    std::is_integral_v<T> && sizeof(T) == 4 && !std::is_same_v<T, bool> && !kIsCharType<T>;
-
-template <typename T>
 inline constexpr bool kIsStdString = false;
 template <typename C, typename Tr, typename A>
 inline constexpr bool kIsStdString<std::basic_string<C, Tr, A>> = true;
@@ -100,6 +92,21 @@ int ScanTargets(OleStringView input, OleStringView format, std::span<const ScanT
 
 }  // namespace detail
 
+// The format fixed at compile time: Scan<OLESTR("-time_t %lu")>(text, &seconds).
+// Same conventions and result as below, without reading the format at run
+// time; the number and kinds of the targets, and the size of a string array
+// against its field's width, are checked by the compiler.
+template <ScanFormat F, typename... Targets>
+int Scan(OleStringView input, Targets&&... targets) noexcept {
+    using Compiled = detail::Compiled<F>;
+    static_assert(sizeof...(Targets) == Compiled::kTargets,
+                  "the format's storing conversions and the targets differ in number");
+    auto list = std::forward_as_tuple(targets...);
+    detail::ScanCursor cursor(input.data(), input.data() + input.size());
+    return detail::RunCompiled<F, 0, 0>(cursor, 0, list);
+}
+
+// The format read at run time.
 template <typename... Targets>
 int Scan(OleStringView input, OleStringView format, Targets&&... targets) noexcept {
     if constexpr (sizeof...(Targets) == 0) {

@@ -3,36 +3,9 @@
 #include <algorithm>
 
 namespace tav::text::detail {
-namespace {
-
-// Calls visit(lo, hi) for every inclusive range of members, single members
-// being ranges of one.
-template <typename Visit>
-void ForEachRange(OleStringView members, Visit&& visit) noexcept {
-    const OLECHAR* p = members.data();
-    const OLECHAR* const last = p + members.size();
-    if (p != last && (*p == u']' || *p == u'-')) {
-        visit(*p, *p);
-        ++p;
-    }
-    while (p != last) {
-        const OLECHAR c = *p++;
-        // p[-2] exists here: a '-' in first place was taken above.
-        if (c == u'-' && p != last && p[-2] <= *p) {
-            // The upper bound itself is added as the next member.
-            if (p[-2] < *p) {
-                visit(p[-2], static_cast<OLECHAR>(*p - 1));
-            }
-        } else {
-            visit(c, c);
-        }
-    }
-}
-
-}  // namespace
 
 ScanSet::ScanSet(OleStringView members, bool negated) noexcept : members_(members), negated_(negated) {
-    ForEachRange(members, [this](OLECHAR lo, OLECHAR hi) {
+    ForEachSetRange(members.data(), members.data() + members.size(), [this](OLECHAR lo, OLECHAR hi) {
         if (hi >= 256) {
             hasHigh_ = true;
         }
@@ -48,7 +21,8 @@ bool ScanSet::HighMember(OLECHAR c) const noexcept {
         return false;
     }
     bool found = false;
-    ForEachRange(members_, [&](OLECHAR lo, OLECHAR hi) { found = found || (lo <= c && c <= hi); });
+    ForEachSetRange(members_.data(), members_.data() + members_.size(),
+                    [&](OLECHAR lo, OLECHAR hi) { found = found || (lo <= c && c <= hi); });
     return found;
 }
 

@@ -46,7 +46,7 @@ HRESULT ControllerObject::UnpackSystemClock(VARIANT* data, FILETIME* clock) {
         .IsBstr(OLESTR("UnpackSystemClock. Invalid argument."))
         .Then([&](Reply& reply) {
             uint32_t seconds = 0;
-            if (text::Scan(reply.Text(), OLESTR("-time_t %lu"), &seconds) != 1) {
+            if (text::Scan<OLESTR("-time_t %lu")>(reply.Text(), &seconds) != 1) {
                 return reply.Fail(E_FAIL, OLESTR("UnpackSystemClock. Unsupported time-format."));
             }
             *clock = FileTimeFromControllerSeconds(seconds);

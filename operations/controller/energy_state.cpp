@@ -44,7 +44,7 @@ HRESULT ControllerObject::UnpackSysEnergyState(VARIANT* data, TavSysEnergyState*
         .IsBstr(OLESTR("UnpackEnergyState. Invalid argument."))
         .Then([&](Reply& reply) {
             OLECHAR word[16] = {};
-            if (text::Scan(reply.Text(), OLESTR("-sysenergy %15s"), word) != 1) {
+            if (text::Scan<OLESTR("-sysenergy %15s")>(reply.Text(), word) != 1) {
                 return reply.Fail(E_FAIL, OLESTR("UnpackEnergyState. Unsupported format."));
             }
             const auto known = std::find_if(std::begin(kEnergyWords), std::end(kEnergyWords),

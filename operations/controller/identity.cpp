@@ -43,7 +43,7 @@ HRESULT ControllerObject::UnpackControllerName(VARIANT* data, BSTR* name) {
         .OutPointer(name, OLESTR(""))
         .Clear(name)
         .IsBstr(OLESTR("UnpackControllerName. Invalid argument."))
-        .QuotedString(OLESTR("-Name \"%256[^\"]"), OLESTR("-Name \"\""), name,
+        .QuotedString<OLESTR("-Name \"%256[^\"]")>(OLESTR("-Name \"\""), name,
                       OLESTR("UnpackControllerName failed."));
 }
 
@@ -78,7 +78,7 @@ HRESULT ControllerObject::UnpackControllerID(VARIANT* data, BSTR* id) {
         .OutPointer(id, OLESTR(""))
         .Clear(id)
         .IsBstr(OLESTR("UnpackControllerID. Non-BSTR VARIANT."))
-        .QuotedString(OLESTR("-ID \"%256[^\"]"), OLESTR("-ID \"\""), id,
+        .QuotedString<OLESTR("-ID \"%256[^\"]")>(OLESTR("-ID \"\""), id,
                       OLESTR("UnpackControllerID failed."));
 }
 

@@ -21,7 +21,7 @@ HRESULT ControllerObject::UnpackIsOptionPresent(VARIANT* data, LONG* present) {
         .OutPointer(present, OLESTR(""))
         .IsBstr(OLESTR("UnpackIsOptionPresent. Non-BSTR variant."))
         .Then([&](Reply& reply) {
-            if (text::Scan(reply.Text(), OLESTR("-OptionPresent %d"), present) != 1) {
+            if (text::Scan<OLESTR("-OptionPresent %d")>(reply.Text(), present) != 1) {
                 return reply.FailWith(E_FAIL, OLESTR("UnpackIsOptionPresent. Bad result string: %s"), reply.Text());
             }
             return S_OK;

@@ -17,19 +17,6 @@ const OLECHAR* TypeArgument(TavControllerInfo type) {
     return nullptr;
 }
 
-// Version information is free text: the caller takes over the reply's own
-// string instead of a decoded copy.
-HRESULT TakeReplyText(ControllerObject& object, TavCommandReply& reply, BSTR* out, OleStringView notTextError,
-                      Where where = Where::current()) {
-    if (reply.data.vt != VT_BSTR) {
-        return object.Errors().Set(E_FAIL, ErrorSite{static_cast<int>(where.line())}, notTextError);
-    }
-    *out = reply.data.bstrVal;
-    reply.data.vt = VT_EMPTY;
-    reply.data.bstrVal = nullptr;
-    return S_OK;
-}
-
 }  // namespace
 
 HRESULT ControllerObject::GetVersionInfo(TavInParams* rip, TavControllerInfo type, BSTR* info) {
@@ -41,10 +28,8 @@ HRESULT ControllerObject::GetVersionInfo(TavInParams* rip, TavControllerInfo typ
         .Require(typeArgument != nullptr, E_INVALIDARG,
                  OLESTR("TavController::GetVersionInfo - Unknown information type"))
         .Get(OLESTR("VersionInfo"), ViewOf(typeArgument))
-        .WithReply([&](TavCommandReply& reply) {
-            return TakeReplyText(*this, reply, info,
-                                 OLESTR("TavController::GetVersionInfo - Controller returned invalid result"));
-        });
+        // Version information is free text: the caller takes over the reply's own string.
+        .TakeText(info, OLESTR("TavController::GetVersionInfo - Controller returned invalid result"));
 }
 
 HRESULT ControllerObject::GetVersionInfoFromSystem(TavInParams* rip, BSTR systemName, TavControllerInfo type,
@@ -59,10 +44,7 @@ HRESULT ControllerObject::GetVersionInfoFromSystem(TavInParams* rip, BSTR system
                  OLESTR("GetVersionInfoFromSystem - Unknown information type"))
         .Get(OLESTR("SystemInfo"),
              text::Format(OLESTR("%s -SystemName \"%s\""), ViewOf(typeArgument), ViewOf(systemName)))
-        .WithReply([&](TavCommandReply& reply) {
-            return TakeReplyText(*this, reply, info,
-                                 OLESTR("GetVersionInfoFromSystem - Controller returned invalid result"));
-        });
+        .TakeText(info, OLESTR("GetVersionInfoFromSystem - Controller returned invalid result"));
 }
 
 HRESULT ControllerObject::UnpackVersionInfo(VARIANT* data, BSTR* info) {

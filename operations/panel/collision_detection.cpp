@@ -1,6 +1,5 @@
 // Collision detection state.
 #include "core/controller_object.h"
-#include "operations/panel/reply_words.h"
 
 namespace tav {
 
@@ -20,8 +19,8 @@ HRESULT ControllerObject::UnpackCollisionDetectState(VARIANT* pVar, TavCollision
         .OutPointer(pState, OLESTR(""))
         .IsBstr(OLESTR("UnpackCollisionDetectState. Non-BSTR argument."))
         .Then([&](Reply& reply) {
-            const auto state = panel::FindWord<TavCollisionDetectState>(
-                panel::ReplyText(reply), {{OLESTR("INIT"), CollisionDetect_Init},
+            const auto state = FindWord<TavCollisionDetectState>(
+                reply.CText(), {{OLESTR("INIT"), CollisionDetect_Init},
                                           {OLESTR("TRIGGERED"), CollisionDetect_Triggered},
                                           {OLESTR("CONFIRMED"), CollisionDetect_Confirmed},
                                           {OLESTR("TRIGGERED_ACK"), CollisionDetect_TriggeredAck}});

@@ -1,6 +1,5 @@
 // Motors state: requesting motors on or off, and reading the state back.
 #include "core/controller_object.h"
-#include "operations/panel/reply_words.h"
 
 namespace tav {
 namespace {
@@ -58,7 +57,7 @@ HRESULT ControllerObject::UnpackControllerState(VARIANT* pData, TavControllerSta
         .OutPointer(pState, OLESTR(""))
         .IsBstr(OLESTR("UnpackControllerState. Non-BSTR argument."))
         .Then([&](Reply& reply) {
-            return reply.Word<TavControllerState>(panel::ReplyText(reply),
+            return reply.Word<TavControllerState>(reply.CText(),
                                                   {{OLESTR("STAND_BY"), MotorsOff},
                                                    {OLESTR("POWER_ON"), MotorsOff},
                                                    {OLESTR("RUN"), MotorsOn},

@@ -3,7 +3,6 @@
 // controller sends its auto conditions with the mode.
 #include "core/controller_object.h"
 #include "operations/panel/auto_conditions.h"
-#include "operations/panel/reply_words.h"
 #include "tav/variant.h"
 
 namespace tav {
@@ -69,7 +68,7 @@ HRESULT ControllerObject::UnpackOperationMode(VARIANT* pData, TavOperationMode* 
         .OutPointer(pMode, OLESTR(""))
         .IsBstr(OLESTR("UnpackOperationMode. Non-BSTR argument."))
         .Then([&](Reply& reply) {
-            return reply.Word<TavOperationMode>(panel::ReplyText(reply),
+            return reply.Word<TavOperationMode>(reply.CText(),
                                                 {{OLESTR("AUTO"), Auto},
                                                  {OLESTR("INIT"), InitOp},
                                                  {OLESTR("MANR"), Manr},
@@ -94,8 +93,8 @@ HRESULT ControllerObject::UnpackOperationMode2(VARIANT* pData, TavOperationMode*
         .Clear(pCycle != nullptr ? pCycle : &noCycle)
         .IsBstr(OLESTR("UnpackOperationMode2. Non-BSTR argument."))
         .Then([&](Reply& reply) {
-            const OleStringView text = panel::ReplyText(reply);
-            const auto steady = panel::FindWord<TavOperationMode>(
+            const OleStringView text = reply.CText();
+            const auto steady = FindWord<TavOperationMode>(
                 text,
                 {{OLESTR("AUTO"), Auto}, {OLESTR("INIT"), InitOp}, {OLESTR("MANR"), Manr}, {OLESTR("MANF"), Manf}});
             if (steady) {
