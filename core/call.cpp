@@ -70,8 +70,10 @@ Call& Call::RetrievalParams(const TavRetrievalParams* params, LONG retrieveAll, 
     return *this;
 }
 
-HRESULT Call::Fail(HRESULT hr, OleStringView text, Where where) {
-    hr_ = object_.Errors().Set(hr, ErrorSite::From(where), text);
+HRESULT Call::Fail(HRESULT hr, OleStringView text, Where where) { return Fail(hr, text, ErrorSite::From(where)); }
+
+HRESULT Call::Fail(HRESULT hr, OleStringView text, ErrorSite site) {
+    hr_ = object_.Errors().Set(hr, site, text);
     return NotifyCallback(object_, rip_, hr_);
 }
 

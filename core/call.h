@@ -84,6 +84,7 @@ private:
 
 enum class Verb { Get, Set };
 
+
 // The call pattern of every command operation: TavInParams, out-pointers,
 // initialised flag, the operation's own checks, then the send. Each step
 // records its own text with the line of the statement that states it, and
@@ -104,6 +105,22 @@ public:
     template <class T>
     [[nodiscard]] Call& OutPointer(T* out, const OLECHAR* text, Where where = Where::current()) {
         return Require(out != nullptr, E_POINTER, text, where);
+    }
+    // Step 2 for several out-pointers: the first NULL one fails with text.
+    template <class... T>
+    [[nodiscard]] Call& OutPointers(SitedText text, T*... outs) {
+        if (!failed() && ((outs == nullptr) || ...)) {
+            Fail(E_POINTER, ViewOf(text.text), text.site);
+        }
+        return *this;
+    }
+    // Out-values cleared once their pointers are known good (NULL, 0).
+    template <class... T>
+    [[nodiscard]] Call& Clear(T*... outs) {
+        if (!failed()) {
+            ((*outs = T{}), ...);
+        }
+        return *this;
     }
     // Step 3.
     [[nodiscard]] Call& Initialised(const OLECHAR* text, Where where = Where::current());
@@ -163,6 +180,7 @@ public:
     // Records a failure found by the operation itself after the TavInParams
     // check, and tells the callback.
     HRESULT Fail(HRESULT hr, OleStringView text, Where where = Where::current());
+    HRESULT Fail(HRESULT hr, OleStringView text, ErrorSite site);
 
 private:
     // The command component's file interface, asked for each time so that

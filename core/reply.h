@@ -19,17 +19,6 @@ namespace tav {
 
 class ControllerObject;
 
-// An error text with the line of the statement that passes it, taken
-// implicitly: for the steps whose last arguments are a list of out-values,
-// after which no location argument can follow.
-struct SitedText {
-    const OLECHAR* text;
-    ErrorSite site;
-
-    SitedText(const OLECHAR* text, std::source_location where = std::source_location::current())  // NOLINT
-        : text(text), site(ErrorSite::From(where)) {}
-};
-
 // The checks that every Unpack operation runs, in their order (initialised,
 // VARIANT, out-pointers, clearing the out-values, VARIANT type), then the
 // decoding of the reply text. After the first failure every later step is

@@ -151,7 +151,13 @@ template <text::FieldSpec Spec, class A>
 struct Storage<Spec, A> {
     static_assert(Spec.width > 0 || HasRoom<A>,
                   "a string field without a width needs an out-value that bounds it (fields::Bounded<N>)");
-    static constexpr std::size_t kRoom = Spec.width > 0 ? Spec.width + 1 : A::kRoom;
+    static constexpr std::size_t kRoom = [] {
+        if constexpr (Spec.width > 0) {
+            return Spec.width + 1;
+        } else {
+            return A::kRoom;
+        }
+    }();
     OLECHAR value[kRoom];
     OLECHAR (&Target())[kRoom] { return value; }
     OleStringView Value() const { return OleStringView(value); }

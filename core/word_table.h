@@ -4,6 +4,7 @@
 #include <initializer_list>
 #include <optional>
 #include <span>
+#include <type_traits>
 
 #include "core/text/ole_string.h"
 
@@ -43,10 +44,15 @@ std::optional<E> FindWord(OleStringView word, std::initializer_list<WordValue<E>
     return FindWord(word, std::span<const WordValue<E>>(table.begin(), table.size()));
 }
 
+template <class E, std::size_t N>
+std::optional<E> FindWord(OleStringView word, const WordValue<E> (&table)[N]) {
+    return FindWord(word, std::span<const WordValue<E>>(table));
+}
+
 // The value of word in table, or fallback for a word the table does not
 // hold (the decoders that succeed on an unknown word).
 template <class E>
-E WordOr(OleStringView word, std::span<const WordValue<E>> table, E fallback) {
+E WordOr(OleStringView word, std::type_identity_t<std::span<const WordValue<E>>> table, E fallback) {
     return FindWord(word, table).value_or(fallback);
 }
 
@@ -58,7 +64,7 @@ E WordOr(OleStringView word, std::initializer_list<WordValue<E>> table, E fallba
 // The word of value in table (the first entry holding it), or null: the
 // direction of the setters.
 template <class E>
-const OLECHAR* WordOf(E value, std::span<const WordValue<E>> table) {
+const OLECHAR* WordOf(E value, std::type_identity_t<std::span<const WordValue<E>>> table) {
     for (const auto& entry : table) {
         if (entry.value == value) {
             return entry.word;
