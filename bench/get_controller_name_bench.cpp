@@ -80,7 +80,8 @@ void Call(benchmark::State& state) {
 // One call's unavoidable work: the command's three strings as Execute takes
 // them (a Get of CtrlName has no arguments to format), the reply text as the
 // controller formats it from the name it keeps, in the BSTR of the reply's
-// VARIANT, the scan of the quoted name out of it, and the caller's BSTR,
+// VARIANT, the scan of the quoted name out of it (in place, without a copy),
+// and the caller's BSTR,
 // returned as the call returns it (NULL when the scan fails).
 BSTR FloorName() {
     const Bstr verb(OLESTR("Get"));
@@ -95,11 +96,12 @@ BSTR FloorName() {
     const BSTR replyText = reply.Get()->bstrVal;
     benchmark::DoNotOptimize(replyText);
 
-    OLECHAR field[257];
-    if (tav::text::Scan(OleStringView(replyText, SysStringLen(replyText)), OLESTR("-Name \"%256[^\"]"), field) != 1) {
+    OleStringView field;
+    if (tav::text::Scan<OLESTR("-Name \"%256[^\"]")>(OleStringView(replyText, SysStringLen(replyText)),
+                                                     tav::text::FieldView{&field}) != 1) {
         return nullptr;
     }
-    return SysAllocString(field);
+    return SysAllocStringLen(field.data(), static_cast<UINT>(field.size()));
 }
 
 void Floor(benchmark::State& state) {

@@ -75,10 +75,10 @@ public:
         static_assert(text::kScanFields<F>.size() == 1 && text::kScanFields<F>[0].kind == text::FieldKind::Chars &&
                           text::kScanFields<F>[0].width > 0,
                       "a quoted string is one string field of a fixed width");
-        OLECHAR field[text::kScanFields<F>[0].width + 1];
+        OleStringView field;
         const OleStringView reply = Text();
-        if (text::Scan<F>(reply, field) == 1) {
-            return Allocate(OleStringView(field), out);
+        if (text::Scan<F>(reply, text::FieldView{&field}) == 1) {
+            return Allocate(field, out);
         }
         if (reply.substr(0, emptyForm.size()) != emptyForm) {
             return Fail(E_FAIL, ViewOf(failText), where);

@@ -151,16 +151,17 @@ template <text::FieldSpec Spec, class A>
 struct Storage<Spec, A> {
     static_assert(Spec.width > 0 || HasRoom<A>,
                   "a string field without a width needs an out-value that bounds it (fields::Bounded<N>)");
+    // Read in place: a field without a width is bounded by its out-value's room.
     static constexpr std::size_t kRoom = [] {
         if constexpr (Spec.width > 0) {
-            return Spec.width + 1;
+            return std::size_t{0};
         } else {
             return A::kRoom;
         }
     }();
-    OLECHAR value[kRoom];
-    OLECHAR (&Target())[kRoom] { return value; }
-    OleStringView Value() const { return OleStringView(value); }
+    OleStringView value;
+    text::FieldView Target() { return text::FieldView{&value, kRoom}; }
+    OleStringView Value() const { return value; }
 };
 
 template <text::FieldSpec Spec, class A>

@@ -113,6 +113,28 @@ public:
         return Step::Next;
     }
 
+    // The same without a copy: *out views the field in the input. A field
+    // of capacity characters or more (capacity 0: no limit) is a matching
+    // failure, as it is for a buffer of that size with its terminator.
+    template <typename Accepts>
+    Step CharactersView(std::size_t width, Accepts&& accepts, OleStringView* out, std::size_t capacity) noexcept {
+        if (AtEnd()) {
+            return Step::InputFailure;
+        }
+        const OLECHAR* const last = FieldEnd(width);
+        const OLECHAR* p = pos_;
+        while (p != last && *p != 0 && accepts(*p)) {
+            ++p;
+        }
+        const auto length = static_cast<std::size_t>(p - pos_);
+        if (length == 0 || (capacity != 0 && length >= capacity)) {
+            return Step::MatchingFailure;
+        }
+        *out = OleStringView(pos_, length);
+        pos_ = p;
+        return Step::Next;
+    }
+
     // %c: one character; out null: suppressed.
     Step Character(OLECHAR* out) noexcept {
         if (AtEnd()) {

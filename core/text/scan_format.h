@@ -273,6 +273,18 @@ inline constexpr bool kIsInt32Target =
 template <typename>
 inline constexpr bool kBadScanTarget = false;
 
+}  // namespace detail
+
+// A string field read without a copy: the view points into the input and is
+// valid as long as the input is. A field of capacity characters or more (0:
+// no limit beyond the width) fails as it would in a buffer of that size.
+struct FieldView {
+    OleStringView* out;
+    std::size_t capacity = 0;
+};
+
+namespace detail {
+
 // Where a string field goes: a fixed array (its size checked against the
 // width at compile time) or a span (checked as it is written).
 template <typename T>
@@ -355,6 +367,13 @@ inline int RunCompiled(ScanCursor& cursor, int stored, Targets& targets) noexcep
                 static_assert(std::is_same_v<std::remove_cvref_t<Target>, OLECHAR*>,
                               "%c is scanned into a pointer to OLECHAR");
                 step = cursor.Character(target);
+            } else if constexpr (std::is_same_v<std::remove_cvref_t<Target>, FieldView>) {
+                if constexpr (op.kind == OpKind::Word) {
+                    step = cursor.CharactersView(
+                        op.width, [](OLECHAR c) { return !IsSpace(c); }, target.out, target.capacity);
+                } else {
+                    step = cursor.CharactersView(op.width, SetAccepts<F, I>, target.out, target.capacity);
+                }
             } else {
                 using Chars = CharsTarget<Target>;
                 static_assert(Chars::kCapacity == 0 || op.width == 0 || Chars::kCapacity > op.width,

@@ -10,14 +10,22 @@
 namespace tav::posix {
 namespace {
 
+// Counted on every allocation without a locked instruction, so the count is
+// exact on one thread and approximate across threads; a diagnostic only.
 std::atomic<long> allocationCount{0};
-// The value of allocationCount at which the armed failure strikes; 0 when none is armed.
-std::atomic<long> failingAllocation{0};
+// Allocations left until the armed failure (1: the next one fails); 0 when
+// none is armed, the common case, which costs one plain load.
+std::atomic<long> countdown{0};
 
 bool InjectedFailure() {
-    long number = allocationCount.fetch_add(1) + 1;
-    long armed = failingAllocation.load();
-    return armed != 0 && number == armed && failingAllocation.compare_exchange_strong(armed, 0);
+    allocationCount.store(allocationCount.load(std::memory_order_relaxed) + 1, std::memory_order_relaxed);
+    long left = countdown.load(std::memory_order_relaxed);
+    while (left > 0) {
+        if (countdown.compare_exchange_weak(left, left - 1)) {
+            return left == 1;
+        }
+    }
+    return false;
 }
 
 }  // namespace
@@ -41,13 +49,13 @@ using namespace tav::posix;
 extern "C" {
 
 bool TavFailAllocationAt(long k) {
-    failingAllocation.store(k > 0 ? allocationCount.load() + k : 0);
+    countdown.store(k > 0 ? k : 0);
     return true;
 }
 
 long TavAllocationCount(void) { return allocationCount.load(); }
 
-bool TavAllocationFailurePending(void) { return failingAllocation.load() != 0; }
+bool TavAllocationFailurePending(void) { return countdown.load() != 0; }
 
 void* TavMemAlloc(size_t size) { return Allocate(size); }
 
