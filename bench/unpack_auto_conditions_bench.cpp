@@ -37,7 +37,7 @@ class Client : public tav::bench::Client {
 public:
     Client() {
         if (Failure() == nullptr &&
-            FAILED(Controller()->QueryInterface(IID_ITavPanel, reinterpret_cast<void**>(&panel_)))) {
+            FAILED(QueryTo(Controller(), panel_))) {
             Fail("cannot reach the controller's ITavPanel");
         }
     }

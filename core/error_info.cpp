@@ -55,7 +55,7 @@ HRESULT ErrorInfo::SetWithShortSuffix(HRESULT hr, ErrorSite site, OleStringView 
 HRESULT ErrorInfo::AdoptFromComponent(HRESULT hr, IUnknown* component, ErrorSite site) {
     OleString text;
     ComPtr<ITavComError> errors;
-    if (component != nullptr && SUCCEEDED(component->QueryInterface(IID_ITavComError, reinterpret_cast<void**>(&errors)))) {
+    if (component != nullptr && SUCCEEDED(QueryTo(component, errors))) {
         Bstr componentText;
         if (SUCCEEDED(errors->GetLastErrorInfo(componentText.Receive())) && !componentText.IsNull()) {
             text.assign(componentText.View());

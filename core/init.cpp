@@ -27,8 +27,7 @@ HRESULT ControllerObject::Init(BSTR url) {
                            OLESTR("TavController::Init - Reinitialization to new controller not allowed."));
     }
 
-    HRESULT hr = CoCreateInstance(CLSID_TavComCtrl, nullptr, CLSCTX_INPROC_SERVER, IID_ITavComCtrl,
-                                  reinterpret_cast<void**>(&command_));
+    HRESULT hr = CoCreateInstance(CLSID_TavComCtrl, nullptr, CLSCTX_INPROC_SERVER, IID_PPV_ARGS(&command_));
     if (FAILED(hr)) {
         return errors_.Set(hr, ErrorSite::Here(), OLESTR("TavController::Init. Could not create TavComCtrl."));
     }
@@ -40,23 +39,22 @@ HRESULT ControllerObject::Init(BSTR url) {
     };
 
     if (version_ >= 8) {
-        if (FAILED(command_->QueryInterface(IID_ITavCommand2, reinterpret_cast<void**>(&command2_)))) {
+        if (FAILED(QueryTo(command_.Get(), command2_))) {
             return fail(errors_.Set(E_NOINTERFACE, ErrorSite::Here(),
                                     OLESTR("TavController::Init. Could not create ITavCommand2.")));
         }
     }
 
     ComPtr<ITavUserComponent> userComponent;
-    hr = CoCreateInstance(CLSID_TavUser, nullptr, CLSCTX_INPROC_SERVER, IID_ITavUserComponent,
-                          reinterpret_cast<void**>(&userComponent));
+    hr = CoCreateInstance(CLSID_TavUser, nullptr, CLSCTX_INPROC_SERVER, IID_PPV_ARGS(&userComponent));
     if (FAILED(hr)) {
         return fail(errors_.Set(hr, ErrorSite::Here(), OLESTR("Could not create TavUser")));
     }
-    hr = userComponent->QueryInterface(IID_ITavUser3, reinterpret_cast<void**>(&user_));
+    hr = QueryTo(userComponent.Get(), user_);
     if (FAILED(hr)) {
         return fail(errors_.Set(hr, ErrorSite::Here(), OLESTR("Could not QI TavUser for ITavUser3")));
     }
-    hr = userComponent->QueryInterface(IID_ITavMastership, reinterpret_cast<void**>(&mastership_));
+    hr = QueryTo(userComponent.Get(), mastership_);
     if (FAILED(hr)) {
         return fail(errors_.Set(hr, ErrorSite::Here(), OLESTR("Could not QI TavUser for ITavMastership")));
     }
@@ -64,7 +62,7 @@ HRESULT ControllerObject::Init(BSTR url) {
     if (FAILED(hr)) {
         return fail(errors_.AdoptFromComponent(hr, userComponent.Get(), ErrorSite::Here()));
     }
-    if (FAILED(command_->QueryInterface(IID_ITavFile, reinterpret_cast<void**>(&file_)))) {
+    if (FAILED(QueryTo(command_.Get(), file_))) {
         return fail(errors_.Set(E_FAIL, ErrorSite::Here(), OLESTR("Init. Failed to query for ITavFile.")));
     }
 

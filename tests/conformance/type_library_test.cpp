@@ -11,6 +11,7 @@
 #include "class_table.h"
 #include "conformance_support.h"
 #include "expectations.h"
+#include "tav/com_scope.h"
 #include "tav/variant.h"
 #include "type_info_view.h"
 
@@ -56,12 +57,13 @@ int SlotCount(std::wstring_view name) {
 class TypeLibrary : public ::testing::Test {
 protected:
     static void SetUpTestSuite() {
-        CoInitializeEx(nullptr, COINIT_MULTITHREADED);
+        com_ = new ComScope();
         loaded_ = LoadRegTypeLib(LIBID_TAVCONTROLLERLib, 1, 0, LOCALE_NEUTRAL, &library_);
     }
     static void TearDownTestSuite() {
         library_ = nullptr;
-        CoUninitialize();
+        delete com_;
+        com_ = nullptr;
     }
     void SetUp() override { ASSERT_EQ(S_OK, loaded_) << "LoadRegTypeLib of TAVCONTROLLERLib 1.0"; }
 
@@ -85,10 +87,12 @@ protected:
         return found->second.second;
     }
 
+    static ComScope* com_;
     static HRESULT loaded_;
     static ComPtr<ITypeLib> library_;
 };
 
+ComScope* TypeLibrary::com_ = nullptr;
 HRESULT TypeLibrary::loaded_ = E_UNEXPECTED;
 ComPtr<ITypeLib> TypeLibrary::library_;
 

@@ -6,6 +6,7 @@
 #include "core/module_lock.h"
 #include "module/class_objects.h"
 #include "module_test_support.h"
+#include "tav/com_scope.h"
 
 namespace tav::test {
 namespace {
@@ -131,7 +132,8 @@ TEST_F(ClassObjects, AllocationFailureGivesOutOfMemory) {
 }
 
 TEST_F(ClassObjects, RegisteredClassObjectsServeCoCreateInstance) {
-    ASSERT_TRUE(SUCCEEDED(CoInitializeEx(nullptr, COINIT_MULTITHREADED)));
+    const ComScope com;
+    ASSERT_TRUE(com);
     ASSERT_EQ(RegisterClassObjects(CLSCTX_INPROC_SERVER, REGCLS_MULTIPLEUSE), S_OK);
     EXPECT_EQ(RegisterClassObjects(CLSCTX_INPROC_SERVER, REGCLS_MULTIPLEUSE), S_OK) << "a second call is harmless";
     {
@@ -142,7 +144,6 @@ TEST_F(ClassObjects, RegisteredClassObjectsServeCoCreateInstance) {
         EXPECT_EQ(DllCanUnloadNow(), S_FALSE);
     }
     RevokeClassObjects();
-    CoUninitialize();
 }
 
 }  // namespace

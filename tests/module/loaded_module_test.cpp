@@ -6,6 +6,7 @@
 #include <filesystem>
 
 #include "module_test_support.h"
+#include "tav/com_scope.h"
 #include "registry_sandbox.h"
 
 #ifndef _WIN32
@@ -99,15 +100,15 @@ TEST(LoadedModule, RegistersItselfAndServesItsClassesThroughCoCreateInstance) {
 #ifndef _WIN32
     // The platform's COM runtime follows the registration to the module.
     // (Windows' own runtime does not see the sandbox's stand-in keys.)
-    ASSERT_TRUE(SUCCEEDED(CoInitializeEx(nullptr, COINIT_MULTITHREADED)));
     {
+        const ComScope com;
+        ASSERT_TRUE(com);
         ComPtr<ITavPanel4> object;
         EXPECT_EQ(CoCreateInstance(CLSID_TavController17, nullptr, CLSCTX_INPROC_SERVER, IID_ITavPanel4, Out(object)),
                   S_OK);
         EXPECT_EQ(canUnloadNow(), S_FALSE);
     }
     EXPECT_EQ(canUnloadNow(), S_OK);
-    CoUninitialize();
 #endif
 
     EXPECT_EQ(unregisterServer(), S_OK);

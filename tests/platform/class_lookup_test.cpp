@@ -3,6 +3,9 @@
 #include "inproc_server/test_inproc_server.h"
 #include "platform_test_support.h"
 #include "tav/com_ptr.h"
+#include "tav/com_scope.h"
+
+#include <optional>
 
 #ifndef _WIN32
 #include <dlfcn.h>
@@ -63,8 +66,9 @@ bool RunningUnderWine() {
 
 class ClassLookup : public testing::Test {
 protected:
-    void SetUp() override { CoInitializeEx(nullptr, COINIT_MULTITHREADED); }
-    void TearDown() override { CoUninitialize(); }
+    void SetUp() override { com_.emplace(); }
+    void TearDown() override { com_.reset(); }
+    std::optional<tav::ComScope> com_;
 
     // Writes InprocServer32 = `path`, ThreadingModel "Both" (else Windows would
     // marshal to an apartment of its own) below HKCU\Software\Classes or HKCR.

@@ -26,7 +26,7 @@ const CLSID& ClassIdOf(LONG version) {
 }
 
 void ControllerTest::SetUp() {
-    comInitialised_ = SUCCEEDED(CoInitializeEx(nullptr, COINIT_MULTITHREADED));
+    com_.emplace();
     callback_ = ReplyRecorder::Make();
     UseComponents({}, {});
 }
@@ -46,9 +46,7 @@ void ControllerTest::TearDown() {
     component_.reset();
     user_.reset();
     callback_.reset();
-    if (comInitialised_) {
-        CoUninitialize();
-    }
+    com_.reset();
 }
 
 void ControllerTest::UseComponents(FakeCommandComponent::Offers command, FakeUserComponent::Offers user) {
@@ -96,7 +94,7 @@ ControllerObject* ControllerTest::Make(LONG version) {
 
 ControllerObject* ControllerTest::MakeThroughClassObject(LONG version) {
     IClassFactory* factory = nullptr;
-    HRESULT hr = DllGetClassObject(ClassIdOf(version), IID_IClassFactory, reinterpret_cast<void**>(&factory));
+    HRESULT hr = DllGetClassObject(ClassIdOf(version), IID_PPV_ARGS(&factory));
     EXPECT_EQ(hr, S_OK) << "DllGetClassObject for class version " << version;
     if (FAILED(hr)) {
         return nullptr;

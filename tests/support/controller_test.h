@@ -14,6 +14,7 @@
 #include "support/fake_user_component.h"
 #include "support/reply_recorder.h"
 #include "support/test_text.h"
+#include "tav/com_scope.h"
 
 namespace tav::test {
 
@@ -101,7 +102,7 @@ private:
     std::optional<ClassRegistration> userRegistration_;
     Ref<ReplyRecorder> callback_;
     std::vector<ControllerObject*> objects_;
-    bool comInitialised_ = false;
+    std::optional<ComScope> com_;
 };
 
 }  // namespace tav::test
