@@ -5,6 +5,7 @@
 
 #include "TavController.h"
 #include "TavSiblings.h"
+#include "core/controller_path.h"
 #include "core/error_site.h"
 #include "core/text/ole_string.h"
 #include "tav/com_ptr.h"
@@ -136,6 +137,15 @@ public:
     // of its own).
     [[nodiscard]] Call& RetrievalParams(const TavRetrievalParams* params, LONG retrieveAll, const OLECHAR* nullText,
                                         const OLECHAR* modeText, Where where = Where::current());
+    // A path that must be a controller path ("ctrl:" in any case, no
+    // backslash, something after the prefix); *sent views it without its
+    // prefix. A blank path fails with an empty text, the others with the
+    // operation's own.
+    [[nodiscard]] Call& ControllerPathOnly(BSTR path, const ControllerPathTexts& texts, OleStringView* sent);
+    // A path that may be a controller path or a local one: a NULL path is
+    // empty, a local path stays as it is, a controller path loses its prefix
+    // and must hold no backslash (else backslashText).
+    [[nodiscard]] Call& ControllerOrLocalPath(BSTR path, const OLECHAR* backslashText, OleStringView* converted);
     // A call into a sibling component as a step of its own (a file copied
     // before the command that names it): on failure, its result with text.
     template <class F, class = std::enable_if_t<std::is_invocable_r_v<HRESULT, F>>>
