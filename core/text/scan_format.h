@@ -308,10 +308,12 @@ struct CharsTarget<std::span<OLECHAR>> : CharsTarget<std::span<OLECHAR>&> {};
 template <>
 struct CharsTarget<const std::span<OLECHAR>&> : CharsTarget<std::span<OLECHAR>&> {};
 
+// The integer is stored as its target's own type: a long is no uint32_t to
+// the optimiser, even where both have 32 bits.
 template <typename T>
-constexpr std::uint32_t* IntegerTarget(T* target) noexcept {
+constexpr void StoreInteger(T* target, std::uint32_t bits) noexcept {
     static_assert(kIsInt32Target<T>, "%d, %u and %n are scanned into a pointer to a 4-byte integer");
-    return reinterpret_cast<std::uint32_t*>(target);
+    *target = static_cast<T>(bits);
 }
 
 template <typename T>
@@ -356,7 +358,11 @@ inline int RunCompiled(ScanCursor& cursor, int stored, Targets& targets) noexcep
             auto&& target = std::get<T>(targets);
             using Target = decltype(target);
             if constexpr (op.kind == OpKind::Signed || op.kind == OpKind::Unsigned) {
-                step = cursor.Integer(op.width, op.kind == OpKind::Signed, IntegerTarget(target));
+                std::uint32_t bits = 0;
+                step = cursor.Integer(op.width, op.kind == OpKind::Signed, &bits);
+                if (step == Step::Next) {
+                    StoreInteger(target, bits);
+                }
             } else if constexpr (op.kind == OpKind::Count) {
                 StoreCount(target, cursor.Consumed());
             } else if constexpr (op.kind == OpKind::Double) {
