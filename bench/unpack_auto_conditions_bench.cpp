@@ -86,15 +86,15 @@ std::int64_t ScanOnly(OleStringView text, std::vector<ScannedElement>& elements)
     std::int32_t flag = 0;
     std::int32_t count = 0;
     std::int32_t consumed = 0;
-    if (tav::text::Scan(text, OLESTR("-auto_ch %d -noelts %d\t%n"), &flag, &count, &consumed) != 2) {
+    if (tav::text::Scan<OLESTR("-auto_ch %d -noelts %d\t%n")>(text, &flag, &count, &consumed) != 2) {
         return -1;
     }
     OleStringView rest = text.substr(static_cast<size_t>(consumed));
     std::int64_t scanned = 0;
     for (; scanned < count; ++scanned) {
         ScannedElement& element = elements[static_cast<size_t>(scanned)];
-        if (tav::text::Scan(rest, OLESTR("%10[^;];%d;%lu\t%n"), element.name, &element.keep, &element.id,
-                            &consumed) != 3) {
+        if (tav::text::Scan<OLESTR("%10[^;];%d;%lu\t%n")>(rest, element.name, &element.keep, &element.id,
+                                                           &consumed) != 3) {
             break;
         }
         rest = rest.substr(static_cast<size_t>(consumed));
