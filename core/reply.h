@@ -10,6 +10,7 @@
 #include "core/error_site.h"
 #include "core/reply_fields.h"
 #include "core/text/char_class.h"
+#include "core/text/format.h"
 #include "core/text/ole_string.h"
 #include "core/text/scan.h"
 #include "core/word_table.h"
@@ -124,6 +125,18 @@ public:
         return FieldsOf<F>(failText, std::index_sequence_for<Outs...>{}, fields::detail::Adapter<Outs>::Of(outs)...);
     }
 
+    // The same, with a failure text whose %s is filled by the reply.
+    template <text::ScanFormat F, class... Outs>
+    [[nodiscard]] HRESULT FieldsQuotingReply(SitedText failFormat, Outs... outs) {
+        if (failed()) {
+            return hr_;
+        }
+        static_assert(sizeof...(Outs) == text::kScanFields<F>.size(),
+                      "one out-value for every storing conversion of the format");
+        quoteReply_ = true;
+        return FieldsOf<F>(failFormat, std::index_sequence_for<Outs...>{}, fields::detail::Adapter<Outs>::Of(outs)...);
+    }
+
     // Custom decoding: decode(*this) returns the result; it reads Text() and
     // reports with Fail, FailWith and Allocate.
     template <class F>
@@ -168,6 +181,9 @@ private:
         using namespace fields::detail;
         StorageSet<std::index_sequence<I...>, Storage<text::kScanFields<F>[I], A>...> set;
         if (text::Scan<F>(Text(), Get<I>(set).Target()...) != CountedFields<F>()) {
+            if (quoteReply_) {
+                return Fail(E_FAIL, text::Format(ViewOf(failText.text), text::UpToNul(Text())), failText.site);
+            }
             return Fail(E_FAIL, ViewOf(failText.text), failText.site);
         }
         HRESULT hr = S_OK;
@@ -191,6 +207,7 @@ private:
     ControllerObject& object_;
     VARIANT* data_;
     HRESULT hr_ = S_OK;
+    bool quoteReply_ = false;
 };
 
 namespace fields {
