@@ -159,6 +159,19 @@ public:
         return *this;
     }
 
+    // A call into a sibling component as a step of its own whose failure
+    // takes over the component's error text, as a failed Execute does.
+    template <class F, class = std::enable_if_t<std::is_invocable_r_v<HRESULT, F>>>
+    [[nodiscard]] Call& InvokeComponent(IUnknown* component, F&& call, Where where = Where::current()) {
+        if (!failed()) {
+            const HRESULT hr = Delivered(std::forward<F>(call)(), component, where);
+            if (FAILED(hr)) {
+                hr_ = hr;
+            }
+        }
+        return *this;
+    }
+
     // Steps 5 and 6: build the command and hand it to the command component.
     [[nodiscard]] SentCommand Get(OleStringView command, OleStringView args = {}, Where where = Where::current());
     [[nodiscard]] SentCommand Set(OleStringView command, OleStringView args = {}, Where where = Where::current());

@@ -7,12 +7,23 @@
 
 namespace tav {
 
+namespace {
+
+LONG volatile lastClientValue = 0;
+
+}  // namespace
+
 ControllerObject::ControllerObject(LONG version, IUnknown* outer)
-    : version_(version), inner_(this), controlling_(outer != nullptr ? outer : &inner_) {
+    : version_(version),
+      clientValue_(static_cast<ULONG>(InterlockedIncrement(&lastClientValue))),
+      inner_(this),
+      controlling_(outer != nullptr ? outer : &inner_) {
     ModuleLock::Add();
 }
 
 ControllerObject::~ControllerObject() {
+    // Messages may still be arriving on the command component's threads.
+    ipc_.Close();
     ReleaseComponents();
     ModuleLock::Remove();
 }

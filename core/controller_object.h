@@ -6,6 +6,7 @@
 #include "core/call.h"
 #include "core/error_info.h"
 #include "core/reply.h"
+#include "operations/ipc/ipc_state.h"
 #include "tav/bstr.h"
 #include "tav/com_ptr.h"
 #include "tav/platform.h"
@@ -60,7 +61,10 @@ public:
     ITavCommand2* Command2() const { return command2_.Get(); }
     ITavUser3* UserComponent() const { return user_.Get(); }
     ITavMastership* MastershipComponent() const { return mastership_.Get(); }
+    // The object's own number among the controller objects of the process,
+    // handed on with ITavCommand2 calls; its IPC proxy id derives from it.
     ULONG ClientValue() const { return clientValue_; }
+    ipc::IpcState& Ipc() { return ipc_; }
 
     // The call pattern and the reply checks of every operation.
     Call Command(TavInParams* rip) { return Call(*this, rip); }
@@ -129,7 +133,8 @@ private:
     ComPtr<ITavFile> file_;
     BYTE initialised_ = 0;
     const LONG version_;
-    ULONG clientValue_ = 0;
+    const ULONG clientValue_;
+    ipc::IpcState ipc_;
 
     Inner inner_;
     IUnknown* controlling_;

@@ -7,7 +7,7 @@ cd "$(dirname "$0")/.."
 bash scripts/install-deps.sh all
 presets=(${TAV_PRESETS:-linux linux-tsan arm mingw})
 # ThreadSanitizer runs the suites whose objects are called from many threads.
-tsan_suites=(core module sim e2e enumerators)
+tsan_suites=(core module sim e2e enumerators ipc)
 for preset in "${presets[@]}"; do
   echo "=== ${preset}: configure and build"
   cmake --preset "$preset" >/dev/null
