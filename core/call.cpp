@@ -77,6 +77,8 @@ HRESULT Call::Fail(HRESULT hr, OleStringView text, ErrorSite site) {
     return NotifyCallback(object_, rip_, hr_);
 }
 
+BSTR Call::StoredUrl() const { return object_.Url(); }
+
 SentCommand Call::Get(OleStringView command, OleStringView args, Where where) {
     return SendTo(object_.Url(), Verb::Get, command, args, where);
 }
@@ -154,6 +156,10 @@ bool SentCommand::Finished(HRESULT* result, Where where) {
     }
     *result = S_OK;
     return false;
+}
+
+HRESULT SentCommand::RecordReplyFailure(Where where) {
+    return object_.Errors().SetFromReply(reply_.Record(), ErrorSite::From(where));
 }
 
 HRESULT SentCommand::StatusOnly(Where where) {

@@ -35,6 +35,13 @@ private:
     TavCommandReply record_;
 };
 
+// The TavInParams check: with a callback, riid must name ITavCommandCallback.
+// A NULL record or a NULL callback passes without riid being read.
+bool ValidInParams(const TavInParams* rip);
+
+// True when a call with these parameters returns before its reply arrives.
+inline bool IsAsync(const TavInParams* rip) { return rip != nullptr && rip->callType != Sync; }
+
 // Steps 5 to 8 of the call pattern, after the command was handed to the
 // command component: the Async return, or the Sync reply's status and decode.
 class SentCommand {
@@ -54,6 +61,22 @@ public:
             return result;
         }
         return std::forward<F>(decode)(reply_.Data());
+    }
+    // As Decode, but a Sync reply with a failure status is decoded too (its
+    // text may carry the controller's findings) before its status is
+    // returned.
+    template <class F>
+    [[nodiscard]] HRESULT DecodeEvenOnFailure(F&& decode, Where where = Where::current()) {
+        HRESULT result;
+        if (!Finished(&result, where)) {
+            return std::forward<F>(decode)(reply_.Data());
+        }
+        if (FAILED(hr_) || IsAsync(rip_)) {
+            return result;
+        }
+        static_cast<void>(std::forward<F>(decode)(reply_.Data()));
+        // Whatever the decoding recorded, the reply's error is the last one.
+        return RecordReplyFailure(where);
     }
     // The raw Sync reply, for the few operations that read it themselves.
     template <class F>
@@ -76,6 +99,7 @@ private:
     // True when the call ends here (a failure, an Async call, or a Sync reply
     // with a failure status), with its result in *result.
     bool Finished(HRESULT* result, Where where);
+    HRESULT RecordReplyFailure(Where where);
 
     ControllerObject& object_;
     TavInParams* rip_;
@@ -177,6 +201,16 @@ public:
     [[nodiscard]] SentCommand Set(OleStringView command, OleStringView args = {}, Where where = Where::current());
     [[nodiscard]] SentCommand Send(Verb verb, OleStringView command, OleStringView args,
                                    Where where = Where::current());
+    // The same with an argument text built only when every step before has
+    // passed: args() returns it.
+    template <class Args, class = std::enable_if_t<std::is_invocable_r_v<OleString, Args>>>
+    [[nodiscard]] SentCommand Send(Verb verb, OleStringView command, Args&& args, Where where = Where::current()) {
+        if (failed()) {
+            return SendTo(StoredUrl(), verb, command, OleStringView(), where);
+        }
+        const OleString text = std::forward<Args>(args)();
+        return SendTo(StoredUrl(), verb, command, text, where);
+    }
     // The same, to a URL other than the stored one.
     [[nodiscard]] SentCommand SendTo(BSTR url, Verb verb, OleStringView command, OleStringView args,
                                      Where where = Where::current());
@@ -206,6 +240,7 @@ public:
     HRESULT Fail(HRESULT hr, OleStringView text, ErrorSite site);
 
 private:
+    BSTR StoredUrl() const;
     // The command component's file interface, asked for each time so that
     // the call sees the component as it is now; null with the failure
     // recorded (at a line of its own) when it has none.
@@ -223,11 +258,5 @@ private:
 // last-error text when hr is a failure; returns hr.
 HRESULT NotifyCallback(ControllerObject& object, TavInParams* rip, HRESULT hr);
 
-// The TavInParams check: with a callback, riid must name ITavCommandCallback.
-// A NULL record or a NULL callback passes without riid being read.
-bool ValidInParams(const TavInParams* rip);
-
-// True when a call with these parameters returns before its reply arrives.
-inline bool IsAsync(const TavInParams* rip) { return rip != nullptr && rip->callType != Sync; }
 
 }  // namespace tav
