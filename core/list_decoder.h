@@ -12,6 +12,7 @@
 #include <cstdint>
 #include <limits>
 #include <memory>
+#include <utility>
 
 #include "core/enumerators.h"
 #include "core/reply.h"
@@ -57,9 +58,15 @@ struct ElementRead {
 // Decodes count elements from `elements` with read(rest, element) and hands
 // them to a new enumerator in *out. A count of zero or less gives an empty
 // enumerator. *out stays null on failure.
-template <class Traits, class ReadElement>
+//
+// afterElements(rest), when given, runs once every element is read and
+// before the enumerator is made: S_FALSE refuses the list with the element
+// text (something follows the last element that may not), a failure is one
+// it has recorded.
+template <class Traits, class ReadElement, class AfterElements>
 HRESULT DecodeList(Reply& reply, const ListTexts& texts, const ListShape& shape, LONG count,
-                   OleStringView elements, ReadElement&& read, typename Traits::Interface** out) {
+                   OleStringView elements, ReadElement&& read, AfterElements&& afterElements,
+                   typename Traits::Interface** out) {
     using Element = typename Traits::Element;
     using Object = EnumeratorObject<Traits>;
     struct Discard {
@@ -112,6 +119,13 @@ HRESULT DecodeList(Reply& reply, const ListTexts& texts, const ListShape& shape,
         rest = rest.substr(std::min(result.consumed, rest.size()));
     }
 
+    const HRESULT after = afterElements(rest);
+    if (after == S_FALSE) {
+        return reply.FailWith(E_FAIL, ViewOf(texts.element), rest);
+    }
+    if (FAILED(after)) {
+        return after;
+    }
     if (!enumerator && FAILED(create())) {
         return reply.Result();
     }
@@ -128,6 +142,14 @@ HRESULT DecodeList(Reply& reply, const ListTexts& texts, const ListShape& shape,
     // The interface holds the object's one reference now.
     enumerator.release();
     return S_OK;
+}
+
+template <class Traits, class ReadElement>
+HRESULT DecodeList(Reply& reply, const ListTexts& texts, const ListShape& shape, LONG count,
+                   OleStringView elements, ReadElement&& read, typename Traits::Interface** out) {
+    return DecodeList<Traits>(
+        reply, texts, shape, count, elements, std::forward<ReadElement>(read), [](OleStringView) { return S_OK; },
+        out);
 }
 
 // A complete list as the retrieve-all request reports it.

@@ -51,6 +51,10 @@ HRESULT Reply::Fail(HRESULT hr, OleStringView text, ErrorSite site) {
 }
 
 HRESULT Reply::FailWith(HRESULT hr, OleStringView format, OleStringView value, Where where) {
+    // Some texts that may quote a value do not: they stand as they are.
+    if (format.find(OLESTR("%s")) == OleStringView::npos) {
+        return Fail(hr, format, where);
+    }
     return Fail(hr, text::Format(format, text::UpToNul(value)), where);
 }
 

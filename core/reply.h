@@ -62,6 +62,15 @@ public:
         return *this;
     }
     [[nodiscard]] Reply& IsBstr(const OLECHAR* text, Where where = Where::current());
+    // A step of the decoder's own that cannot fail (clearing a field of an
+    // in/out record), run only while nothing has failed.
+    template <class F>
+    [[nodiscard]] Reply& Do(F&& step) {
+        if (!failed()) {
+            std::forward<F>(step)();
+        }
+        return *this;
+    }
 
     // Decoding shapes shared by many operations. Each is the last step.
 
