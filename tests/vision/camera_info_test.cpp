@@ -104,6 +104,60 @@ TEST_F(CameraInfoTest, TheGrammarIsMatchedAsItStands) {
     EXPECT_EQ(info.Unpack(*object, reply.Get()), E_FAIL);
 }
 
+// The first generation's grammars and their borrowed texts.
+TEST_F(CameraInfoTest, FirstGenerationDecodersKeepTheirTexts) {
+    ControllerObject* object = Make();
+    const std::string byIndex =
+        "-currIPAddress \"1.1.1.1\" -currSubnetMask \"2\" -currDefaultGateway \"3\" -currHostName \"h\" "
+        "-currDNSServer \"d\" -currDNSSuffix \"s\" -currIsDHCPEnabled 0 -confIPAddress \"4\" -confSubnetMask \"5\" "
+        "-confDefaultGateway \"6\" -confHostName \"h2\" -confDNSServer \"d2\" -confDNSSuffix \"s2\" "
+        "-confIsDHCPEnabled 1 -confCameraName \"Conf\" -cameraName \"Cam\" -macAddress \"m\" -Status \"";
+    std::array<TestBstr, 15> t;
+    LONG d1 = 0, d2 = 0;
+    TavCameraStatus status{};
+    auto byIndexUnpack = [&](const std::string& reply) {
+        TestVariant data = TestVariant::Text(reply);
+        return object->UnpackCameraInfoUsingIndex(data.Get(), t[0].Out(), t[1].Out(), t[2].Out(), t[3].Out(),
+                                                  t[4].Out(), t[5].Out(), &d1, t[6].Out(), t[7].Out(), t[8].Out(),
+                                                  t[9].Out(), t[10].Out(), t[11].Out(), &d2, t[12].Out(), t[13].Out(),
+                                                  t[14].Out(), &status);
+    };
+    ASSERT_EQ(byIndexUnpack(byIndex + "Program\""), S_OK);
+    EXPECT_EQ(status, CameraStatus_Program);
+    EXPECT_EQ(t[13].Text(), "Cam\"");
+    EXPECT_EQ(d2, 1);
+    EXPECT_EQ(byIndexUnpack(byIndex + "Standby\""), E_FAIL);
+    EXPECT_TRUE(HasError("UnpackCameraInfoUsingIndex received unexpected camera status."));
+    EXPECT_EQ(byIndexUnpack(byIndex + "\""), E_FAIL) << "an empty status";
+    EXPECT_TRUE(HasError("UnpackLANAdaptorIPConfig failed."));
+
+    std::string byName = byIndex;
+    byName.replace(byName.find("-currDNSServer \""), 16, "-currDNSServer\"");
+    byName.replace(byName.find("-confDNSSuffix"), 14, "-ConfDNSSuffix");
+    byName.replace(byName.find("-cameraName \"Cam\""), 18, "-cameraIdx 7");
+    byName.replace(byName.find("-macAddress \"m\" -Status"), 24, "-macAddress\"m\"  -Status");
+    ULONG index = 0;
+    auto byNameUnpack = [&](const std::string& reply) {
+        TestVariant data = TestVariant::Text(reply);
+        return object->UnpackCameraInfo(data.Get(), t[0].Out(), t[1].Out(), t[2].Out(), t[3].Out(), t[4].Out(),
+                                        t[5].Out(), &d1, t[6].Out(), t[7].Out(), t[8].Out(), t[9].Out(), t[10].Out(),
+                                        t[11].Out(), &d2, t[12].Out(), &index, t[14].Out(), &status);
+    };
+    ASSERT_EQ(byNameUnpack(byName + "Running\""), S_OK);
+    EXPECT_EQ(index, 7u);
+    EXPECT_EQ(status, CameraStatus_Running);
+    EXPECT_EQ(byNameUnpack(byName + "Busy\""), E_FAIL);
+    EXPECT_TRUE(HasError("UnpackCameraInfo received unexpected camera status."));
+    EXPECT_EQ(byNameUnpack(byIndex + "Running\""), E_FAIL) << "the by-index grammar is not the by-name one";
+    EXPECT_TRUE(HasError("UnpackLANAdaptorIPConfig failed."));
+    TestVariant number = TestVariant::Number(1);
+    EXPECT_EQ(object->UnpackCameraInfo(number.Get(), t[0].Out(), t[1].Out(), t[2].Out(), t[3].Out(), t[4].Out(),
+                                       t[5].Out(), &d1, t[6].Out(), t[7].Out(), t[8].Out(), t[9].Out(), t[10].Out(),
+                                       t[11].Out(), &d2, t[12].Out(), &index, t[14].Out(), nullptr),
+              E_POINTER);
+    EXPECT_TRUE(HasError("UnpackCameraInfoUsingIndex. Invalid out pointer"));
+}
+
 TEST_F(CameraInfoTest, GetCameraInfo2ChecksInitialisationBeforeTheName) {
     ControllerObject* fresh = MakeUninitialised();
     CameraInfo info;
