@@ -16,8 +16,9 @@
 //     HRESULT Commit(Reply&, Value) and optionally HRESULT Check(Reply&, Value)
 // with Value OleStringView for a string field, std::uint32_t for a number,
 // double or OLECHAR; and, for a string field without a width ("%s"), the
-// room it allows, terminator included, as static constexpr size_t kRoom: a
-// longer field is refused, never cut.
+// room it allows, terminator included, as static constexpr size_t kRoom (0:
+// any length, for a word that is only compared): a longer field is refused,
+// never cut.
 #include <cstddef>
 #include <cstdint>
 #include <span>
@@ -41,9 +42,11 @@ struct Bounded {
     HRESULT Commit(Reply& reply, OleStringView value) const;
 };
 
-// A word mapped by table; an unknown word refuses the reply with text.
+// A word mapped by table; an unknown word refuses the reply with text. A
+// word is only compared, never kept: a field without a width may hold any.
 template <class E>
 struct Mapped {
+    static constexpr std::size_t kRoom = 0;
     E* out;
     std::span<const WordValue<E>> table;
     const OLECHAR* unknownText;
@@ -57,6 +60,7 @@ struct Mapped {
 // A word mapped by table; an unknown word gives fallback.
 template <class E>
 struct MappedOr {
+    static constexpr std::size_t kRoom = 0;
     E* out;
     std::span<const WordValue<E>> table;
     E fallback;
