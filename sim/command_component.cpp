@@ -1,9 +1,14 @@
 #include "sim/command_component.h"
 
+#include <algorithm>
+#include <fstream>
+#include <iterator>
 #include <thread>
 
 #include "sim/command_runner.h"
+#include "sim/file_system.h"
 #include "sim/controller_registry.h"
+#include "sim/subsystems/ipc.h"
 #include "tav/guarded.h"
 #include "sim/status_codes.h"
 #include "tav/variant.h"
@@ -14,8 +19,6 @@ namespace {
 constexpr TextView kComponent = OLESTR("TavComCtrl.");
 
 TextView ViewOf(BSTR text) { return text == nullptr ? TextView() : TextView(text, SysStringLen(text)); }
-
-Text Quoted(TextView text) { return OLESTR("\"") + Text(text) + OLESTR("\""); }
 
 // Puts a reply into the caller's record; the record's VARIANT is taken to
 // hold nothing.
@@ -60,6 +63,14 @@ ComPtr<_ITavObjectEvents> SinkOf(const TavEventParams& params) {
     return sink;
 }
 
+bool Succeeded(FileSystem::Result result, TextView path, Text& error) {
+    if (result == FileSystem::Result::Done) {
+        return true;
+    }
+    error = Concat({Quoted(path), OLESTR(": "), ResultText(result)});
+    return false;
+}
+
 }  // namespace
 
 HRESULT CommandComponent::Create(IUnknown* outer, REFIID riid, void** object) {
@@ -91,7 +102,8 @@ CommandComponent::~CommandComponent() {
     }
     replies_.Stop();
     if (bound) {
-        bound->DisconnectClient(clientId_);
+        ipc::ClientGone(*bound, clientId_.load());
+        bound->DisconnectClient(clientId_.load());
     }
 }
 
@@ -119,10 +131,6 @@ HRESULT CommandComponent::QueryInterface(REFIID riid, void** object) {
 
 HRESULT CommandComponent::Fail(HRESULT hr, Text text) { return lastError_.Record(hr, text); }
 
-HRESULT CommandComponent::NotProvided(TextView operation) {
-    return Fail(E_NOTIMPL, Text(kComponent) + Text(operation) + OLESTR(": not provided by the virtual controller"));
-}
-
 std::shared_ptr<ControllerModel> CommandComponent::Reach(TextView url) {
     auto controller = ControllerAt(url);
     if (!controller) {
@@ -135,9 +143,8 @@ std::shared_ptr<ControllerModel> CommandComponent::Reach(TextView url) {
         }
         bound_ = controller;
     }
-    const std::uint32_t id = controller->ConnectClient(OLESTR("TavController"));
-    std::lock_guard lock(mutex_);
-    clientId_ = id;
+    clientId_ = controller->ConnectClient(OLESTR("TavController"));
+    LinkMessageSink();
     return controller;
 }
 
@@ -151,29 +158,30 @@ std::shared_ptr<SubscriptionHub> CommandComponent::Hub() {
 
 HRESULT CommandComponent::Execute(TavInParams* rip, TavCommandReply* reply, BSTR verb, BSTR url, BSTR command,
                                   BSTR args) {
-    return Guarded([&] { return Carry(rip, reply, ViewOf(verb), url, command, args, OLESTR("Execute")); });
+    return Guarded([&] { return Carry(rip, reply, ViewOf(verb), url, command, args, 0, OLESTR("Execute")); });
 }
 
-HRESULT CommandComponent::ExecuteEx(TavInParams* rip, TavCommandReply* reply, TavInParams*, ULONG, BSTR url,
+HRESULT CommandComponent::ExecuteEx(TavInParams* rip, TavCommandReply* reply, TavInParams*, ULONG clientValue, BSTR url,
                                     BSTR command, BSTR args, ULONG* result) {
     return Guarded([&] {
         if (result != nullptr) {
             *result = 0;
         }
-        return Carry(rip, reply, OLESTR("Set"), url, command, args, OLESTR("ExecuteEx"));
+        return Carry(rip, reply, OLESTR("Set"), url, command, args, clientValue, OLESTR("ExecuteEx"));
     });
 }
 
 // The success path makes no copies and no texts: a Sync call reads the
 // caller's strings where they are.
 HRESULT CommandComponent::Carry(TavInParams* rip, TavCommandReply* reply, TextView verb, BSTR url, BSTR command,
-                                BSTR args, TextView operation) {
+                                BSTR args, ULONG clientValue, TextView operation) {
     auto where = [operation] { return Text(kComponent) + Text(operation); };
     if (reply == nullptr) {
         return Fail(E_POINTER, where() + OLESTR(": no reply record"));
     }
-    const Command request{verb, ViewOf(command), ViewOf(args), ViewOf(url)};
+    Command request{verb, ViewOf(command), ViewOf(args), ViewOf(url)};
     const auto controller = Reach(request.url);
+    request.caller = Caller{clientId_.load(std::memory_order_relaxed), clientValue};
     if (!controller) {
         return Fail(E_INVALIDARG, where() + OLESTR(": no controller at URL ") + Quoted(request.url));
     }
@@ -198,11 +206,12 @@ HRESULT CommandComponent::Carry(TavInParams* rip, TavCommandReply* reply, TextVi
         return Fail(E_NOINTERFACE, where() + OLESTR(": the callback is no ITavCommandCallback"));
     }
     const ULONG userDef = rip->userDef;
-    const bool posted = replies_.Post([controller, callback, userDef, timeOut, verbText = Text(request.verb),
+    const bool posted = replies_.Post([controller, callback, userDef, timeOut, caller = request.caller,
+                                       verbText = Text(request.verb),
                                        nameText = Text(request.name), argsText = Text(request.args),
                                        urlText = Text(request.url)](const TaskQueue::Context& context) {
         Guarded([&] {
-            const auto result = RunCommand(*controller, Command{verbText, nameText, argsText, urlText}, timeOut,
+            const auto result = RunCommand(*controller, Command{verbText, nameText, argsText, urlText, caller}, timeOut,
                                            [&context](std::chrono::milliseconds delay) { return context.Sleep(delay); });
             if (result && callback) {
                 TavCommandReply record{};
@@ -296,33 +305,138 @@ HRESULT CommandComponent::Unsubscribe(TavInParams*, ULONG cookie) {
 }
 
 HRESULT CommandComponent::ConnectIPCSink(IUnknown* sink) {
-    std::lock_guard lock(mutex_);
-    ipcSink_ = ComPtr<IUnknown>(sink);
-    return S_OK;
+    return Guarded([&] {
+        ComPtr<_ITavIPCMessages> messages;
+        if (sink != nullptr &&
+            FAILED(sink->QueryInterface(IID__ITavIPCMessages, reinterpret_cast<void**>(&messages)))) {
+            return Fail(E_NOINTERFACE, Text(kComponent) + OLESTR("ConnectIPCSink: the sink is no _ITavIPCMessages"));
+        }
+        {
+            std::lock_guard lock(mutex_);
+            messageSink_ = std::move(messages);
+        }
+        LinkMessageSink();
+        return S_OK;
+    });
 }
 
-HRESULT CommandComponent::SendIPCMessage(TavInParams*, TavIPCHeaderInternal*, byte*, LONG) {
-    return Guarded([&] { return NotProvided(OLESTR("SendIPCMessage")); });
+void CommandComponent::LinkMessageSink() {
+    std::shared_ptr<ControllerModel> bound;
+    ComPtr<_ITavIPCMessages> sink;
+    {
+        std::lock_guard lock(mutex_);
+        bound = bound_;
+        sink = messageSink_;
+    }
+    const std::uint32_t id = clientId_.load();
+    if (bound && id != 0) {
+        bound->Links().SetMessageSink(id, std::move(sink));
+    }
 }
 
-HRESULT CommandComponent::CopyFileToController(TavInParams*, BSTR, BSTR, BSTR) {
-    return Guarded([&] { return NotProvided(OLESTR("CopyFileToController")); });
+HRESULT CommandComponent::SendIPCMessage(TavInParams*, TavIPCHeaderInternal* header, byte* data, LONG size) {
+    return Guarded([&] {
+        if (header == nullptr) {
+            return Fail(E_POINTER, Text(kComponent) + OLESTR("SendIPCMessage: no message header"));
+        }
+        std::shared_ptr<ControllerModel> bound;
+        {
+            std::lock_guard lock(mutex_);
+            bound = bound_;
+        }
+        if (!bound) {
+            return Fail(E_UNEXPECTED, Text(kComponent) + OLESTR("SendIPCMessage: not connected to a controller"));
+        }
+        if (auto down = bound->Faults().Transport()) {
+            return Fail(down->status, std::move(down->text));
+        }
+        Text error;
+        const HRESULT hr = ipc::RouteMessage(*bound, Caller{clientId_.load(std::memory_order_relaxed), 0}, *header,
+                                             data, size, error);
+        return FAILED(hr) ? Fail(hr, std::move(error)) : S_OK;
+    });
 }
 
-HRESULT CommandComponent::CopyFileFromController(TavInParams*, BSTR, BSTR, BSTR) {
-    return Guarded([&] { return NotProvided(OLESTR("CopyFileFromController")); });
+HRESULT CommandComponent::CopyFileToController(TavInParams*, BSTR url, BSTR localPath, BSTR ctrlPath) {
+    return Guarded([&] {
+        return OnFiles(url, OLESTR("CopyFileToController"), [&](FileSystem& files, Text& error) {
+            std::ifstream in(Narrow(ViewOf(localPath)), std::ios::binary);
+            if (!in) {
+                error = OLESTR("cannot read the local file ") + Quoted(ViewOf(localPath));
+                return false;
+            }
+            std::string bytes((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+            return Succeeded(files.Write(ViewOf(ctrlPath), std::move(bytes)), ViewOf(ctrlPath), error);
+        });
+    });
 }
 
-HRESULT CommandComponent::CreateControllerDirectory(TavInParams*, BSTR, BSTR) {
-    return Guarded([&] { return NotProvided(OLESTR("CreateControllerDirectory")); });
+HRESULT CommandComponent::CopyFileFromController(TavInParams*, BSTR url, BSTR ctrlPath, BSTR localPath) {
+    return Guarded([&] {
+        return OnFiles(url, OLESTR("CopyFileFromController"), [&](FileSystem& files, Text& error) {
+            const std::string* bytes = files.Read(ViewOf(ctrlPath));
+            if (bytes == nullptr) {
+                return Succeeded(FileSystem::Result::NotFound, ViewOf(ctrlPath), error);
+            }
+            std::ofstream out(Narrow(ViewOf(localPath)), std::ios::binary | std::ios::trunc);
+            if (!out || !out.write(bytes->data(), static_cast<std::streamsize>(bytes->size()))) {
+                error = OLESTR("cannot write the local file ") + Quoted(ViewOf(localPath));
+                return false;
+            }
+            return true;
+        });
+    });
 }
 
-HRESULT CommandComponent::DeleteControllerFile(TavInParams*, BSTR, BSTR) {
-    return Guarded([&] { return NotProvided(OLESTR("DeleteControllerFile")); });
+HRESULT CommandComponent::CreateControllerDirectory(TavInParams*, BSTR url, BSTR ctrlDir) {
+    return Guarded([&] {
+        return OnFiles(url, OLESTR("CreateControllerDirectory"), [&](FileSystem& files, Text& error) {
+            return Succeeded(files.MakeFolders(ViewOf(ctrlDir)), ViewOf(ctrlDir), error);
+        });
+    });
 }
 
-HRESULT CommandComponent::GetControllerFileSize(TavInParams*, BSTR, BSTR, ULONG*) {
-    return Guarded([&] { return NotProvided(OLESTR("GetControllerFileSize")); });
+HRESULT CommandComponent::DeleteControllerFile(TavInParams*, BSTR url, BSTR ctrlPath) {
+    return Guarded([&] {
+        return OnFiles(url, OLESTR("DeleteControllerFile"), [&](FileSystem& files, Text& error) {
+            if (files.IsFolder(ViewOf(ctrlPath))) {
+                return Succeeded(FileSystem::Result::IsAFolder, ViewOf(ctrlPath), error);
+            }
+            return Succeeded(files.Remove(ViewOf(ctrlPath)), ViewOf(ctrlPath), error);
+        });
+    });
+}
+
+HRESULT CommandComponent::GetControllerFileSize(TavInParams*, BSTR url, BSTR ctrlPath, ULONG* size) {
+    return Guarded([&] {
+        if (size == nullptr) {
+            return Fail(E_POINTER, Text(kComponent) + OLESTR("GetControllerFileSize: no size pointer"));
+        }
+        *size = 0;
+        return OnFiles(url, OLESTR("GetControllerFileSize"), [&](FileSystem& files, Text& error) {
+            const auto found = files.Size(ViewOf(ctrlPath));
+            if (!found) {
+                return Succeeded(FileSystem::Result::NotFound, ViewOf(ctrlPath), error);
+            }
+            *size = static_cast<ULONG>(std::min<std::uint64_t>(*found, 0xFFFFFFFFu));
+            return true;
+        });
+    });
+}
+
+template <typename F>
+HRESULT CommandComponent::OnFiles(BSTR url, TextView operation, F&& work) {
+    const auto controller = Reach(ViewOf(url));
+    if (!controller) {
+        return Fail(E_INVALIDARG, Concat({kComponent, operation, OLESTR(": no controller at URL "), Quoted(ViewOf(url))}));
+    }
+    if (auto down = controller->Faults().Transport()) {
+        return Fail(down->status, std::move(down->text));
+    }
+    Text error;
+    const bool done = controller->Update(
+        [&](ModelState& state, EventPosts&) { return work(state.Part<FileSystem>(), error); });
+    return done ? S_OK : Fail(kStatusNotFound, Concat({kComponent, operation, OLESTR(": "), error}));
 }
 
 // The file link is the command link: up unless the transport is failing.

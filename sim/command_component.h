@@ -1,5 +1,6 @@
 #pragma once
 #include "sim/last_error.h"
+#include <atomic>
 #include <memory>
 #include <mutex>
 
@@ -73,18 +74,24 @@ private:
     std::shared_ptr<SubscriptionHub> Hub();
 
     HRESULT Carry(TavInParams* rip, TavCommandReply* reply, TextView verb, BSTR url, BSTR command, BSTR args,
-                  TextView operation);
+                  ULONG clientValue, TextView operation);
+    // Hands the connected message sink to the bound controller, so that
+    // messages for this client's slots reach it.
+    void LinkMessageSink();
     HRESULT AddSubscription(TavEventParams* params, TextView eventName, BSTR eventArgs, LONG kind, ULONG* cookie,
                             TextView operation);
-    HRESULT NotProvided(TextView operation);
+    // Runs work(FileSystem&, Text& error) on the files of the controller at
+    // url; false from it fails the operation with the error text.
+    template <typename F>
+    HRESULT OnFiles(BSTR url, TextView operation, F&& work);
 
     ObjectLifetime lifetime_;
     std::mutex mutex_;
     LastError lastError_;
     std::shared_ptr<ControllerModel> bound_;
-    std::uint32_t clientId_ = 0;
+    std::atomic<std::uint32_t> clientId_{0};
     std::shared_ptr<SubscriptionHub> hub_;
-    ComPtr<IUnknown> ipcSink_;
+    ComPtr<_ITavIPCMessages> messageSink_;
     TaskQueue replies_;
 };
 

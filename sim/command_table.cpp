@@ -1,5 +1,8 @@
 #include "sim/command_table.h"
 
+#include <algorithm>
+#include <vector>
+
 #include "sim/status_codes.h"
 
 namespace tav::sim {
@@ -13,41 +16,67 @@ Service ServiceOf(TextView url) {
     return Service::Controller;
 }
 
-const CommandRow* Find(const Command& command, bool& nameKnown) {
-    const std::span<const CommandRow> groups[] = {ClockCommands(), IdentityCommands(), PanelCommands()};
-    nameKnown = false;
-    for (const auto& group : groups) {
-        for (const CommandRow& row : group) {
-            if (row.name == command.name) {
-                nameKnown = true;
-                if (row.verb == command.verb) {
-                    return &row;
-                }
+// Every command row of every subsystem, sorted by name and verb once, so that
+// a command is found by a binary search whatever the number of subsystems.
+class CommandIndex {
+public:
+    CommandIndex() {
+        for (const Subsystem* subsystem : Subsystems()) {
+            for (const CommandRow& row : subsystem->commands) {
+                rows_.push_back(&row);
             }
         }
+        std::sort(rows_.begin(), rows_.end(), [](const CommandRow* a, const CommandRow* b) {
+            return a->name != b->name ? a->name < b->name : a->verb < b->verb;
+        });
     }
-    return nullptr;
-}
 
-Text Quoted(TextView text) { return OLESTR("\"") + Text(text) + OLESTR("\""); }
+    // The rows of this name (both verbs), empty for an unknown name.
+    std::span<const CommandRow* const> Named(TextView name) const {
+        const auto first = std::lower_bound(rows_.begin(), rows_.end(), name,
+                                            [](const CommandRow* row, TextView key) { return row->name < key; });
+        auto last = first;
+        while (last != rows_.end() && (*last)->name == name) {
+            ++last;
+        }
+        return {first, last};
+    }
+
+private:
+    std::vector<const CommandRow*> rows_;
+};
+
+const CommandIndex& Index() {
+    static const CommandIndex index;
+    return index;
+}
 
 }  // namespace
 
+std::span<const Subsystem* const> Subsystems() {
+#define TAV_SIM_SUBSYSTEM(name) &name##Subsystem(),
+    static const Subsystem* const all[] = {
+#include "sim/subsystems/list.inc"
+    };
+#undef TAV_SIM_SUBSYSTEM
+    return all;
+}
+
 Reply Dispatch(ControllerModel& controller, const Command& command) {
-    bool nameKnown = false;
-    const CommandRow* row = Find(command, nameKnown);
-    if (row == nullptr) {
-        if (nameKnown) {
-            return Refuse(kStatusUnknownCommand, Text(command.name) + OLESTR(": verb ") + Quoted(command.verb) +
-                                                     OLESTR(" not supported"));
-        }
+    const auto rows = Index().Named(command.name);
+    if (rows.empty()) {
         return Refuse(kStatusUnknownCommand, OLESTR("Unknown command ") + Quoted(command.name));
     }
-    const Service service = ServiceOf(command.url);
-    if (row->service != service) {
+    const auto row = std::find_if(rows.begin(), rows.end(),
+                                  [&command](const CommandRow* candidate) { return candidate->verb == command.verb; });
+    if (row == rows.end()) {
+        return Refuse(kStatusUnknownCommand, Text(command.name) + OLESTR(": verb ") + Quoted(command.verb) +
+                                                 OLESTR(" not supported"));
+    }
+    if ((*row)->service != ServiceOf(command.url)) {
         return Refuse(kStatusUnknownCommand, Text(command.name) + OLESTR(" is not served at ") + Quoted(command.url));
     }
-    return row->handler(controller, command);
+    return (*row)->handler(controller, command);
 }
 
 }  // namespace tav::sim

@@ -1,7 +1,9 @@
 #pragma once
 #include <span>
 
+#include "sim/caller.h"
 #include "sim/controller_model.h"
+#include "sim/event_table.h"
 #include "sim/reply.h"
 
 namespace tav::sim {
@@ -12,6 +14,7 @@ struct Command {
     TextView name;  // "CtrlName"
     TextView args;  // "-Name \"cell 7\"", a bare word, or empty
     TextView url;   // as given: "/sim" or "/sim/DHROOT"
+    Caller caller{};
 };
 
 // Where a command is served: most at the controller's URL, a few at a
@@ -20,8 +23,7 @@ enum class Service { Controller, DhRoot };
 
 using CommandHandler = Reply (*)(ControllerModel& controller, const Command& command);
 
-// One row per command the controller knows. Adding a command is one row in
-// the table of its group and one handler.
+// One row per command the controller knows.
 struct CommandRow {
     TextView verb;
     TextView name;
@@ -29,10 +31,20 @@ struct CommandRow {
     Service service = Service::Controller;
 };
 
-// The tables of the command groups, one file each under commands/.
-std::span<const CommandRow> ClockCommands();
-std::span<const CommandRow> IdentityCommands();
-std::span<const CommandRow> PanelCommands();
+// What one subsystem of the controller answers: its commands and the events
+// it raises. Its state is a record of its own in ModelState::Part.
+struct Subsystem {
+    std::span<const CommandRow> commands;
+    std::span<const EventRow> events = {};
+};
+
+// The subsystems, one file each under subsystems/, listed in
+// subsystems/list.inc.
+#define TAV_SIM_SUBSYSTEM(name) const Subsystem& name##Subsystem();
+#include "sim/subsystems/list.inc"
+#undef TAV_SIM_SUBSYSTEM
+
+std::span<const Subsystem* const> Subsystems();
 
 // Runs the command's handler, or answers a failure status and text for a
 // command, verb or service that the controller does not know.

@@ -53,6 +53,7 @@ std::uint32_t ControllerModel::ConnectClient(TextView application) {
 }
 
 void ControllerModel::DisconnectClient(std::uint32_t id) {
+    links_.Forget(id);
     Update([id](ModelState& state, EventPosts&) {
         std::erase_if(state.clients, [id](const ConnectedClient& client) { return client.id == id; });
     });

@@ -5,6 +5,7 @@
 #include <utility>
 #include <vector>
 
+#include "sim/client_links.h"
 #include "sim/faults.h"
 #include "sim/model_state.h"
 
@@ -42,6 +43,16 @@ public:
 
     const Text& Url() const { return url_; }
     FaultSwitches& Faults() { return faults_; }
+    ClientLinks& Links() { return links_; }
+
+    // A subsystem's object that lives as long as the controller, outside the
+    // model's lock and untouched by Reset: for state on a hot path that keeps
+    // a lock of its own (message routing). Made on first use.
+    template <typename T>
+    T& Shared() {
+        std::lock_guard lock(sharedMutex_);
+        return shared_.Get<T>();
+    }
 
     // Calls read(const ModelState&) under the lock and returns what it returns.
     template <typename F>
@@ -104,6 +115,9 @@ private:
     mutable std::mutex mutex_;
     ModelState state_;
     FaultSwitches faults_;
+    ClientLinks links_;
+    std::mutex sharedMutex_;
+    StateParts shared_;
 
     std::mutex listenersMutex_;
     std::vector<std::weak_ptr<ModelListener>> listeners_;

@@ -4,6 +4,7 @@
 #include <set>
 #include <vector>
 
+#include "sim/state_parts.h"
 #include "sim/text.h"
 
 namespace tav::sim {
@@ -72,6 +73,17 @@ struct ModelState {
     std::vector<AutoCondition> pendingConditions;  // not answered yet
     std::vector<AutoConditionAnswer> answers;      // of the latest change to automatic
     CollisionState collision = CollisionState::Init;
+
+    // The record of each subsystem that keeps its state next to its commands.
+    template <typename T>
+    T& Part() {
+        return parts.Get<T>();
+    }
+    template <typename T>
+    const T& Part() const {
+        return parts.Get<T>();
+    }
+    StateParts parts;
 };
 
 // A freshly started controller called controllerName, booted at startupTime.

@@ -115,4 +115,6 @@ Text FromBstr(BSTR text) {
     return Text(text, SysStringLen(text));
 }
 
+Text Quoted(TextView text) { return Concat({OLESTR("\""), text, OLESTR("\"")}); }
+
 }  // namespace tav::sim

@@ -36,6 +36,9 @@ bool EqualsIgnoringCase(TextView a, TextView b);
 bool IsBlank(OLECHAR c);
 TextView Trim(TextView text);
 
+// The text in double quotes, as the controller quotes names in its texts.
+Text Quoted(TextView text);
+
 // The controller's error texts end in "; ", so that what a client appends to
 // them stays readable; adds it where it is missing.
 Text ErrorText(TextView text);

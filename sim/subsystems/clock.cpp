@@ -67,6 +67,9 @@ constexpr CommandRow kRows[] = {
 
 }  // namespace
 
-std::span<const CommandRow> ClockCommands() { return kRows; }
+const Subsystem& ClockSubsystem() {
+    static constexpr Subsystem subsystem{kRows};
+    return subsystem;
+}
 
 }  // namespace tav::sim

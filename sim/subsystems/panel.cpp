@@ -10,8 +10,6 @@
 namespace tav::sim {
 namespace {
 
-Text Quoted(TextView text) { return OLESTR("\"") + Text(text) + OLESTR("\""); }
-
 bool IsModeChange(OperationMode mode) {
     return mode == OperationMode::AutoChange || mode == OperationMode::ManfChange;
 }
@@ -190,8 +188,21 @@ constexpr CommandRow kRows[] = {
     {OLESTR("Get"), OLESTR("ColdetState"), GetCollisionDetectState},
 };
 
+Text StateEvent(const ModelState& state, const Arguments&) { return state.motors; }
+Text ModeEvent(const ModelState& state, const Arguments&) { return ModeText(state); }
+Text AutoConditionEvent(const ModelState& state, const Arguments&) { return AutoConditionList(state); }
+
+constexpr EventRow kEvents[] = {
+    {OLESTR("State"), EventStyle::Value, StateEvent},
+    {OLESTR("Mode"), EventStyle::Value, ModeEvent},
+    {OLESTR("AutoCondSub"), EventStyle::Value, AutoConditionEvent},
+};
+
 }  // namespace
 
-std::span<const CommandRow> PanelCommands() { return kRows; }
+const Subsystem& PanelSubsystem() {
+    static constexpr Subsystem subsystem{kRows, kEvents};
+    return subsystem;
+}
 
 }  // namespace tav::sim

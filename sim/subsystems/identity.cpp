@@ -8,8 +8,6 @@
 namespace tav::sim {
 namespace {
 
-Text Quoted(TextView text) { return OLESTR("\"") + Text(text) + OLESTR("\""); }
-
 Reply BadArguments(const Command& command, TextView expected) {
     return Refuse(kStatusBadArgument,
                   Text(command.name) + OLESTR(": expected ") + Text(expected) + OLESTR(", got ") + Quoted(command.args));
@@ -176,6 +174,9 @@ constexpr CommandRow kRows[] = {
 
 }  // namespace
 
-std::span<const CommandRow> IdentityCommands() { return kRows; }
+const Subsystem& IdentitySubsystem() {
+    static constexpr Subsystem subsystem{kRows};
+    return subsystem;
+}
 
 }  // namespace tav::sim
