@@ -472,4 +472,12 @@ HRESULT CommandComponent::BindController(BSTR url) {
     });
 }
 
+HRESULT CommandComponent::GetClientId(ULONG* clientId) {
+    if (clientId == nullptr) {
+        return E_POINTER;
+    }
+    *clientId = clientId_.load();
+    return *clientId == 0 ? E_UNEXPECTED : S_OK;
+}
+
 }  // namespace tav::sim

@@ -61,6 +61,7 @@ public:
 
     // IControllerBinding
     HRESULT STDMETHODCALLTYPE BindController(BSTR url) override;
+    HRESULT STDMETHODCALLTYPE GetClientId(ULONG* clientId) override;
 
 private:
     CommandComponent();

@@ -36,6 +36,8 @@ struct CommandRow {
 struct Subsystem {
     std::span<const CommandRow> commands;
     std::span<const EventRow> events = {};
+    // A client went away: what it held is let go. Under the model's lock.
+    void (*clientGone)(ModelState& state, std::uint32_t clientId) = nullptr;
 };
 
 // The subsystems, one file each under subsystems/, listed in

@@ -7,8 +7,11 @@ namespace tav::sim {
 // which Init hands the controller URL and the command component, tells the
 // command component which controller it serves, so that subscriptions made
 // before any command still reach it.
+// It also tells which client the controller knows the pair as, which the
+// user component names its own ("this is me").
 struct IControllerBinding : public IUnknown {
     virtual HRESULT STDMETHODCALLTYPE BindController(BSTR url) = 0;
+    virtual HRESULT STDMETHODCALLTYPE GetClientId(ULONG* clientId) = 0;
 };
 
 // {6F0C93E2-2B57-4D1A-9E7C-5D4A1B3C8F21}

@@ -1,5 +1,7 @@
 #include "sim/controller_model.h"
 
+#include "sim/command_table.h"
+
 #include <algorithm>
 #include <chrono>
 
@@ -56,6 +58,11 @@ void ControllerModel::DisconnectClient(std::uint32_t id) {
     links_.Forget(id);
     Update([id](ModelState& state, EventPosts&) {
         std::erase_if(state.clients, [id](const ConnectedClient& client) { return client.id == id; });
+        for (const Subsystem* subsystem : Subsystems()) {
+            if (subsystem->clientGone != nullptr) {
+                subsystem->clientGone(state, id);
+            }
+        }
     });
 }
 

@@ -2,7 +2,10 @@
 
 #include "sim/controller_binding.h"
 #include "sim/controller_registry.h"
+#include "sim/arguments.h"
+#include "tav/bstr.h"
 #include "tav/guarded.h"
+#include "tav/variant.h"
 
 namespace tav::sim {
 namespace {
@@ -45,12 +48,6 @@ HRESULT UserComponent::QueryInterface(REFIID riid, void** object) {
 
 HRESULT UserComponent::Fail(HRESULT hr, Text text) { return lastError_.Record(hr, text); }
 
-HRESULT UserComponent::NotProvided(TextView operation) {
-    return Guarded([&] {
-        return Fail(E_NOTIMPL, Text(kComponent) + Text(operation) + OLESTR(": not provided by the virtual controller"));
-    });
-}
-
 HRESULT UserComponent::Initialize(BSTR url, IUnknown* commandComponent) {
     return Guarded([&] {
         const Text urlText = FromBstr(url);
@@ -58,70 +55,389 @@ HRESULT UserComponent::Initialize(BSTR url, IUnknown* commandComponent) {
             return Fail(E_INVALIDARG, Text(kComponent) + OLESTR("Initialize: no controller at URL \"") + urlText +
                                           OLESTR("\""));
         }
+        ComPtr<ITavComCtrl> commands;
+        if (commandComponent == nullptr ||
+            FAILED(commandComponent->QueryInterface(IID_ITavComCtrl, reinterpret_cast<void**>(&commands)))) {
+            return Fail(E_NOINTERFACE, Text(kComponent) + OLESTR("Initialize: no command component"));
+        }
         // Another command component (a test's) simply is not told.
         ComPtr<IControllerBinding> binding;
-        if (commandComponent != nullptr &&
-            SUCCEEDED(commandComponent->QueryInterface(IID_IControllerBinding, reinterpret_cast<void**>(&binding)))) {
+        ULONG clientId = 0;
+        if (SUCCEEDED(commandComponent->QueryInterface(IID_IControllerBinding, reinterpret_cast<void**>(&binding)))) {
             const HRESULT hr = binding->BindController(url);
             if (FAILED(hr)) {
                 return Fail(hr, Text(kComponent) + OLESTR("Initialize: the command component refused the URL"));
             }
+            binding->GetClientId(&clientId);
         }
         std::lock_guard lock(mutex_);
         url_ = urlText;
         commandComponent_ = ComPtr<IUnknown>(commandComponent);
+        commands_ = std::move(commands);
+        clientId_ = clientId;
+        actingAs_ = clientId;
         return S_OK;
     });
 }
 
-HRESULT UserComponent::LogonUser(TavInParams*) { return NotProvided(OLESTR("LogonUser")); }
-HRESULT UserComponent::LogonUserAsLocal(TavInParams*) { return NotProvided(OLESTR("LogonUserAsLocal")); }
-HRESULT UserComponent::LogoffUser(TavInParams*) { return NotProvided(OLESTR("LogoffUser")); }
-HRESULT UserComponent::RequestManualModePrivileges(TavInParams*, TavManualModePrivileges) {
-    return NotProvided(OLESTR("RequestManualModePrivileges"));
+HRESULT UserComponent::Send(TavInParams* rip, TextView operation, TextView verb, TextView command, TextView args,
+                            Text* reply, bool* answered) {
+    if (answered != nullptr) {
+        *answered = false;
+    }
+    ComPtr<ITavComCtrl> commands;
+    Text url;
+    {
+        std::lock_guard lock(mutex_);
+        commands = commands_;
+        url = url_;
+    }
+    if (!commands) {
+        return Fail(E_UNEXPECTED, Concat({kComponent, operation, OLESTR(": not initialized")}));
+    }
+    const Bstr verbText{OleStringView(verb)};
+    const Bstr urlText{OleStringView(url)};
+    const Bstr commandText{OleStringView(command)};
+    const Bstr argsText{OleStringView(args)};
+    TavCommandReply record{};
+    VariantInit(&record.data);
+    const HRESULT hr = commands->Execute(rip, &record, verbText.Get(), urlText.Get(), commandText.Get(), argsText.Get());
+    Variant data;
+    data.Attach(record.data);
+    if (FAILED(hr)) {
+        Bstr text;
+        ComPtr<ITavComError> errors;
+        if (SUCCEEDED(commands.As(errors))) {
+            errors->GetLastErrorInfo(text.Receive());
+        }
+        return Fail(hr, Concat({kComponent, operation, OLESTR(": "), FromBstr(text.Get())}));
+    }
+    if (rip != nullptr && rip->callType != Sync) {
+        return S_OK;
+    }
+    const Text replyText = data.Get()->vt == VT_BSTR ? FromBstr(data.Get()->bstrVal) : Text();
+    if (FAILED(record.status)) {
+        return Fail(record.status, Concat({kComponent, operation, OLESTR(": "), replyText}));
+    }
+    if (reply != nullptr) {
+        *reply = replyText;
+    }
+    if (answered != nullptr) {
+        *answered = true;
+    }
+    return S_OK;
 }
-HRESULT UserComponent::PollActiveRequest(TavInParams*) { return NotProvided(OLESTR("PollActiveRequest")); }
-HRESULT UserComponent::CancelManualModePrivileges(TavInParams*) {
-    return NotProvided(OLESTR("CancelManualModePrivileges"));
+
+ULONG UserComponent::Me() const {
+    std::lock_guard lock(mutex_);
+    return actingAs_;
 }
-HRESULT UserComponent::UnpackManualModePrivRequestEvent(VARIANT*, TavLoginInfo*, ULONG*, TavManualModePrivileges*) {
-    return NotProvided(OLESTR("UnpackManualModePrivRequestEvent"));
+
+namespace {
+
+// The texts of a login in a reply, handed out as BSTRs; nothing is handed
+// out unless all three are.
+HRESULT FillLogin(const Arguments& arguments, TavLoginInfo* login) {
+    if (login == nullptr) {
+        return S_OK;
+    }
+    Bstr alias{OleStringView(arguments.Find(OLESTR("-Alias")).value_or(TextView()))};
+    Bstr location{OleStringView(arguments.Find(OLESTR("-Location")).value_or(TextView()))};
+    Bstr application{OleStringView(arguments.Find(OLESTR("-Application")).value_or(TextView()))};
+    if (alias.Get() == nullptr || location.Get() == nullptr || application.Get() == nullptr) {
+        return E_OUTOFMEMORY;
+    }
+    login->userAlias = alias.Detach();
+    login->location = location.Detach();
+    login->application = application.Detach();
+    return S_OK;
 }
-HRESULT UserComponent::GrantManualModePrivileges(TavInParams*, ULONG, TavManualModePrivileges) {
-    return NotProvided(OLESTR("GrantManualModePrivileges"));
+
+void ClearLogin(TavLoginInfo* login) {
+    if (login != nullptr) {
+        *login = TavLoginInfo{};
+    }
 }
-HRESULT UserComponent::GetManualModePrivilegesState(TavInParams*, TavManualModePrivilegesState*, TavLoginInfo*,
-                                                    LONG*) {
-    return NotProvided(OLESTR("GetManualModePrivilegesState"));
+
+// Reads "-Key value" replies; the text of a VARIANT that must hold a BSTR.
+std::optional<Arguments> RepliedPairs(const VARIANT* data) {
+    if (data == nullptr || data->vt != VT_BSTR) {
+        return std::nullopt;
+    }
+    return Arguments::Parse(FromBstr(data->bstrVal));
 }
-HRESULT UserComponent::UnpackManualModePrivilegesState(VARIANT*, ULONG, TavManualModePrivilegesState*, TavLoginInfo*,
-                                                       LONG*) {
-    return NotProvided(OLESTR("UnpackManualModePrivilegesState"));
+
+}  // namespace
+
+HRESULT UserComponent::LogonUser(TavInParams* rip) {
+    return Guarded([&] { return Send(rip, OLESTR("LogonUser"), OLESTR("Set"), OLESTR("UserLogon"), OLESTR("-Local 0")); });
 }
-HRESULT UserComponent::GetUserGrants(TavInParams*, BSTR*) { return NotProvided(OLESTR("GetUserGrants")); }
-HRESULT UserComponent::GetPendingManualModePrivRequest(TavInParams*, TavLoginInfo*, ULONG*,
-                                                       TavManualModePrivileges*) {
-    return NotProvided(OLESTR("GetPendingManualModePrivRequest"));
+
+HRESULT UserComponent::LogonUserAsLocal(TavInParams* rip) {
+    return Guarded(
+        [&] { return Send(rip, OLESTR("LogonUserAsLocal"), OLESTR("Set"), OLESTR("UserLogon"), OLESTR("-Local 1")); });
 }
-HRESULT UserComponent::UnpackPendingManualModePrivRequest(VARIANT*, TavLoginInfo*, ULONG*,
-                                                          TavManualModePrivileges*) {
-    return NotProvided(OLESTR("UnpackPendingManualModePrivRequest"));
+
+HRESULT UserComponent::LogoffUser(TavInParams* rip) {
+    return Guarded([&] {
+        const HRESULT hr = Send(rip, OLESTR("LogoffUser"), OLESTR("Set"), OLESTR("UserLogoff"), {});
+        if (SUCCEEDED(hr)) {
+            std::lock_guard lock(mutex_);
+            actingAs_ = clientId_;
+        }
+        return hr;
+    });
 }
-HRESULT UserComponent::GetUserId(TavInParams*, ULONG*) { return NotProvided(OLESTR("GetUserId")); }
-HRESULT UserComponent::ImpersonateUser(TavInParams*, ULONG, ULONG*) { return NotProvided(OLESTR("ImpersonateUser")); }
-HRESULT UserComponent::RemoveImpersonation(TavInParams*) { return NotProvided(OLESTR("RemoveImpersonation")); }
-HRESULT UserComponent::RequestMastership(TavInParams*, TavMastershipResource) {
-    return NotProvided(OLESTR("RequestMastership"));
+
+HRESULT UserComponent::RequestManualModePrivileges(TavInParams* rip, TavManualModePrivileges priv) {
+    return Guarded([&] {
+        return Send(rip, OLESTR("RequestManualModePrivileges"), OLESTR("Set"), OLESTR("RMMPRequest"),
+                    OLESTR("-Priv ") + Decimal(static_cast<int>(priv)));
+    });
 }
-HRESULT UserComponent::ReleaseMastership(TavInParams*, TavMastershipResource) {
-    return NotProvided(OLESTR("ReleaseMastership"));
+
+HRESULT UserComponent::PollActiveRequest(TavInParams* rip) {
+    return Guarded([&] { return Send(rip, OLESTR("PollActiveRequest"), OLESTR("Set"), OLESTR("RMMPPoll"), {}); });
 }
-HRESULT UserComponent::GetCurrentMaster(TavInParams*, TavMastershipResource, TavMastershipStatus*, TavLoginInfo*,
-                                        LONG*) {
-    return NotProvided(OLESTR("GetCurrentMaster"));
+
+HRESULT UserComponent::CancelManualModePrivileges(TavInParams* rip) {
+    return Guarded(
+        [&] { return Send(rip, OLESTR("CancelManualModePrivileges"), OLESTR("Set"), OLESTR("RMMPCancel"), {}); });
 }
-HRESULT UserComponent::UnpackCurrentMaster(VARIANT*, ULONG, TavMastershipStatus*, TavLoginInfo*, LONG*) {
-    return NotProvided(OLESTR("UnpackCurrentMaster"));
+
+HRESULT UserComponent::UnpackManualModePrivRequestEvent(VARIANT* data, TavLoginInfo* user, ULONG* userId,
+                                                        TavManualModePrivileges* priv) {
+    return Guarded([&] {
+        const Text operation = OLESTR("UnpackManualModePrivRequestEvent");
+        if (userId == nullptr || priv == nullptr || user == nullptr) {
+            return Fail(E_POINTER, Concat({kComponent, operation, OLESTR(": invalid out-pointer")}));
+        }
+        ClearLogin(user);
+        *userId = 0;
+        *priv = TavManualModePrivileges_None;
+        const auto pairs = RepliedPairs(data);
+        const auto id = pairs ? pairs->Unsigned(OLESTR("-UserId")) : std::nullopt;
+        const auto asked = pairs ? pairs->Signed(OLESTR("-Priv")) : std::nullopt;
+        if (!id || !asked) {
+            return Fail(E_FAIL, Concat({kComponent, operation, OLESTR(": not a privilege request")}));
+        }
+        if (FAILED(FillLogin(*pairs, user))) {
+            return Fail(E_OUTOFMEMORY, Concat({kComponent, operation, OLESTR(": out of memory")}));
+        }
+        *userId = *id;
+        *priv = static_cast<TavManualModePrivileges>(*asked);
+        return S_OK;
+    });
+}
+
+HRESULT UserComponent::GrantManualModePrivileges(TavInParams* rip, ULONG userId, TavManualModePrivileges priv) {
+    return Guarded([&] {
+        return Send(rip, OLESTR("GrantManualModePrivileges"), OLESTR("Set"), OLESTR("RMMPGrant"),
+                    Concat({OLESTR("-UserId "), Decimal(userId), OLESTR(" -Priv "), Decimal(static_cast<int>(priv))}));
+    });
+}
+
+HRESULT UserComponent::GetManualModePrivilegesState(TavInParams* rip, TavManualModePrivilegesState* state,
+                                                    TavLoginInfo* user, LONG* thisIsMe) {
+    return Guarded([&] {
+        Text reply;
+        bool answered = false;
+        const HRESULT hr =
+            Send(rip, OLESTR("GetManualModePrivilegesState"), OLESTR("Get"), OLESTR("RMMPState"), {}, &reply, &answered);
+        if (FAILED(hr) || !answered) {
+            return hr;
+        }
+        const Bstr text{OleStringView(reply)};
+        VARIANT data;
+        data.vt = VT_BSTR;
+        data.bstrVal = text.Get();
+        return UnpackManualModePrivilegesState(&data, Me(), state, user, thisIsMe);
+    });
+}
+
+HRESULT UserComponent::UnpackManualModePrivilegesState(VARIANT* data, ULONG clientId,
+                                                       TavManualModePrivilegesState* state, TavLoginInfo* user,
+                                                       LONG* thisIsMe) {
+    return Guarded([&] {
+        const Text operation = OLESTR("UnpackManualModePrivilegesState");
+        if (state == nullptr || user == nullptr || thisIsMe == nullptr) {
+            return Fail(E_POINTER, Concat({kComponent, operation, OLESTR(": invalid out-pointer")}));
+        }
+        ClearLogin(user);
+        *state = TavManualModePrivilegesState_None;
+        *thisIsMe = 0;
+        const auto pairs = RepliedPairs(data);
+        const auto value = pairs ? pairs->Signed(OLESTR("-State")) : std::nullopt;
+        const auto cid = pairs ? pairs->Unsigned(OLESTR("-Cid")) : std::nullopt;
+        if (!value || !cid) {
+            return Fail(E_FAIL, Concat({kComponent, operation, OLESTR(": not a privilege state")}));
+        }
+        if (FAILED(FillLogin(*pairs, user))) {
+            return Fail(E_OUTOFMEMORY, Concat({kComponent, operation, OLESTR(": out of memory")}));
+        }
+        *state = static_cast<TavManualModePrivilegesState>(*value);
+        *thisIsMe = *cid != 0 && *cid == clientId ? 1 : 0;
+        return S_OK;
+    });
+}
+
+HRESULT UserComponent::GetUserGrants(TavInParams* rip, BSTR* grants) {
+    return Guarded([&] {
+        if (grants == nullptr) {
+            return Fail(E_POINTER, Text(kComponent) + OLESTR("GetUserGrants: invalid out-pointer"));
+        }
+        *grants = nullptr;
+        Text reply;
+        bool answered = false;
+        const HRESULT hr = Send(rip, OLESTR("GetUserGrants"), OLESTR("Get"), OLESTR("UserGrants"), {}, &reply, &answered);
+        if (FAILED(hr) || !answered) {
+            return hr;
+        }
+        Bstr text{OleStringView(reply)};
+        if (text.Get() == nullptr) {
+            return Fail(E_OUTOFMEMORY, Text(kComponent) + OLESTR("GetUserGrants: out of memory"));
+        }
+        *grants = text.Detach();
+        return S_OK;
+    });
+}
+
+HRESULT UserComponent::GetPendingManualModePrivRequest(TavInParams* rip, TavLoginInfo* user, ULONG* userId,
+                                                       TavManualModePrivileges* priv) {
+    return Guarded([&] {
+        Text reply;
+        bool answered = false;
+        const HRESULT hr = Send(rip, OLESTR("GetPendingManualModePrivRequest"), OLESTR("Get"), OLESTR("RMMPPending"),
+                                {}, &reply, &answered);
+        if (FAILED(hr) || !answered) {
+            return hr;
+        }
+        const Bstr text{OleStringView(reply)};
+        VARIANT data;
+        data.vt = VT_BSTR;
+        data.bstrVal = text.Get();
+        return UnpackPendingManualModePrivRequest(&data, user, userId, priv);
+    });
+}
+
+HRESULT UserComponent::UnpackPendingManualModePrivRequest(VARIANT* data, TavLoginInfo* user, ULONG* userId,
+                                                          TavManualModePrivileges* priv) {
+    return UnpackManualModePrivRequestEvent(data, user, userId, priv);
+}
+
+HRESULT UserComponent::GetUserId(TavInParams* rip, ULONG* userId) {
+    return Guarded([&] {
+        if (userId == nullptr) {
+            return Fail(E_POINTER, Text(kComponent) + OLESTR("GetUserId: invalid out-pointer"));
+        }
+        *userId = 0;
+        Text reply;
+        bool answered = false;
+        const HRESULT hr = Send(rip, OLESTR("GetUserId"), OLESTR("Get"), OLESTR("UserId"), {}, &reply, &answered);
+        if (FAILED(hr) || !answered) {
+            return hr;
+        }
+        const auto pairs = Arguments::Parse(reply);
+        const auto id = pairs ? pairs->Unsigned(OLESTR("-UserId")) : std::nullopt;
+        if (!id) {
+            return Fail(E_FAIL, Text(kComponent) + OLESTR("GetUserId: bad reply ") + Quoted(reply));
+        }
+        *userId = *id;
+        return S_OK;
+    });
+}
+
+HRESULT UserComponent::ImpersonateUser(TavInParams* rip, ULONG userId, ULONG* cid) {
+    return Guarded([&] {
+        if (cid == nullptr) {
+            return Fail(E_POINTER, Text(kComponent) + OLESTR("ImpersonateUser: invalid out-pointer"));
+        }
+        *cid = 0;
+        Text reply;
+        bool answered = false;
+        const HRESULT hr = Send(rip, OLESTR("ImpersonateUser"), OLESTR("Set"), OLESTR("Impersonate"),
+                                OLESTR("-UserId ") + Decimal(userId), &reply, &answered);
+        if (FAILED(hr) || !answered) {
+            return hr;
+        }
+        const auto pairs = Arguments::Parse(reply);
+        const auto other = pairs ? pairs->Unsigned(OLESTR("-Cid")) : std::nullopt;
+        if (!other) {
+            return Fail(E_FAIL, Text(kComponent) + OLESTR("ImpersonateUser: bad reply ") + Quoted(reply));
+        }
+        *cid = *other;
+        std::lock_guard lock(mutex_);
+        actingAs_ = *other;
+        return S_OK;
+    });
+}
+
+HRESULT UserComponent::RemoveImpersonation(TavInParams* rip) {
+    return Guarded([&] {
+        const HRESULT hr = Send(rip, OLESTR("RemoveImpersonation"), OLESTR("Set"), OLESTR("RemoveImpersonation"), {});
+        if (SUCCEEDED(hr)) {
+            std::lock_guard lock(mutex_);
+            actingAs_ = clientId_;
+        }
+        return hr;
+    });
+}
+
+HRESULT UserComponent::RequestMastership(TavInParams* rip, TavMastershipResource resource) {
+    return Guarded([&] {
+        return Send(rip, OLESTR("RequestMastership"), OLESTR("Set"), OLESTR("MastershipRequest"),
+                    OLESTR("-Resource ") + Decimal(static_cast<int>(resource)));
+    });
+}
+
+HRESULT UserComponent::ReleaseMastership(TavInParams* rip, TavMastershipResource resource) {
+    return Guarded([&] {
+        return Send(rip, OLESTR("ReleaseMastership"), OLESTR("Set"), OLESTR("MastershipRelease"),
+                    OLESTR("-Resource ") + Decimal(static_cast<int>(resource)));
+    });
+}
+
+HRESULT UserComponent::GetCurrentMaster(TavInParams* rip, TavMastershipResource resource, TavMastershipStatus* status,
+                                        TavLoginInfo* loginInfo, LONG* thisIsMe) {
+    return Guarded([&] {
+        Text reply;
+        bool answered = false;
+        const HRESULT hr = Send(rip, OLESTR("GetCurrentMaster"), OLESTR("Get"), OLESTR("CurrentMaster"),
+                                OLESTR("-Resource ") + Decimal(static_cast<int>(resource)), &reply, &answered);
+        if (FAILED(hr) || !answered) {
+            return hr;
+        }
+        const Bstr text{OleStringView(reply)};
+        VARIANT data;
+        data.vt = VT_BSTR;
+        data.bstrVal = text.Get();
+        return UnpackCurrentMaster(&data, Me(), status, loginInfo, thisIsMe);
+    });
+}
+
+HRESULT UserComponent::UnpackCurrentMaster(VARIANT* data, ULONG cid, TavMastershipStatus* status,
+                                           TavLoginInfo* loginInfo, LONG* thisIsMe) {
+    return Guarded([&] {
+        const Text operation = OLESTR("UnpackCurrentMaster");
+        if (status == nullptr || loginInfo == nullptr || thisIsMe == nullptr) {
+            return Fail(E_POINTER, Concat({kComponent, operation, OLESTR(": invalid out-pointer")}));
+        }
+        ClearLogin(loginInfo);
+        *status = TavMastershipStatus_None;
+        *thisIsMe = 0;
+        const auto pairs = RepliedPairs(data);
+        const auto value = pairs ? pairs->Signed(OLESTR("-Status")) : std::nullopt;
+        const auto holder = pairs ? pairs->Unsigned(OLESTR("-Cid")) : std::nullopt;
+        if (!value || !holder) {
+            return Fail(E_FAIL, Concat({kComponent, operation, OLESTR(": not a master text")}));
+        }
+        if (FAILED(FillLogin(*pairs, loginInfo))) {
+            return Fail(E_OUTOFMEMORY, Concat({kComponent, operation, OLESTR(": out of memory")}));
+        }
+        *status = static_cast<TavMastershipStatus>(*value);
+        *thisIsMe = *holder != 0 && *holder == cid ? 1 : 0;
+        return S_OK;
+    });
 }
 
 HRESULT UserComponent::GetLastErrorInfo(BSTR* errorText) { return lastError_.CopyTo(errorText); }

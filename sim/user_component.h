@@ -11,7 +11,8 @@ namespace tav::sim {
 
 // The user component (class TavUser) of the virtual controller. Initialize
 // binds the command component to the controller URL; the user and mastership
-// operations are not simulated yet and answer E_NOTIMPL with an error text.
+// operations send commands of their own through that command component (so
+// the controller knows the client) and decode the replies.
 class UserComponent final : public ITavUserComponent, public ITavUser3, public ITavMastership, public ITavComError {
 public:
     static HRESULT Create(IUnknown* outer, REFIID riid, void** object);
@@ -68,13 +69,23 @@ private:
     ~UserComponent() = default;
 
     HRESULT Fail(HRESULT hr, Text text);
-    HRESULT NotProvided(TextView operation);
+
+    // Sends one command. Sync (or no pRip): the reply text in `reply` once the
+    // controller accepted it; Async: S_OK once sent, the reply goes to the
+    // caller's callback and `sent` stays false.
+    HRESULT Send(TavInParams* rip, TextView operation, TextView verb, TextView command, TextView args,
+                 Text* reply = nullptr, bool* answered = nullptr);
+    // The client this component acts as: its own, or the one it impersonates.
+    ULONG Me() const;
 
     ObjectLifetime lifetime_;
-    std::mutex mutex_;
+    mutable std::mutex mutex_;
     LastError lastError_;
     Text url_;
     ComPtr<IUnknown> commandComponent_;
+    ComPtr<ITavComCtrl> commands_;
+    ULONG clientId_ = 0;
+    ULONG actingAs_ = 0;
 };
 
 }  // namespace tav::sim

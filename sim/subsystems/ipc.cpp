@@ -1,7 +1,10 @@
 // Inter-process messaging: slots, routing, flow control, slot information.
 #include "sim/subsystems/ipc.h"
 
+#include <chrono>
+#include <condition_variable>
 #include <deque>
+#include <thread>
 #include <map>
 #include <mutex>
 #include <vector>
@@ -34,6 +37,7 @@ struct Slot {
     short maxMsg = 0;
     short maxSize = 0;
     bool full = false;        // the owner reported its queue full
+    std::chrono::steady_clock::time_point fullSince;
     bool flushing = false;    // someone is handing held messages over
     std::deque<Message> held; // kept while the owner's queue is full
 };
@@ -45,9 +49,32 @@ struct Route {
     std::uint32_t owner = 0;
 };
 
+void Flush(ControllerModel& controller, short slotId);
+
 class Router {
 public:
     Router() { slots_[kEchoSlot] = Slot{kEchoSlotName, 0, 0, 200, static_cast<short>(kMaxBodySize)}; }
+    ~Router() {
+        {
+            std::lock_guard lock(mutex);
+            stopping_ = true;
+        }
+        wake_.notify_all();
+        if (retrier_.joinable()) {
+            retrier_.join();
+        }
+    }
+
+    // A full report and a report of room can cross on their way from the
+    // client, and a client reports room only at one level: so a slot that
+    // stays full with messages held is offered its next message again after
+    // a while. A client that has no room refuses it and it stays held.
+    void RetryLater(ControllerModel& controller) {
+        if (!retrier_.joinable()) {
+            retrier_ = std::thread([this, &controller] { Retry(controller); });
+        }
+        wake_.notify_all();
+    }
 
     std::mutex mutex;
     std::map<short, Slot> slots_;
@@ -64,9 +91,54 @@ public:
         }
         return nextId_++;
     }
+
+private:
+    static constexpr std::chrono::milliseconds kRetryAfter{20};
+
+    void Retry(ControllerModel& controller) {
+        std::unique_lock lock(mutex);
+        while (!stopping_) {
+            std::vector<short> due;
+            bool waiting = false;
+            for (auto& [id, slot] : slots_) {
+                if (slot.full && !slot.held.empty() && !slot.flushing) {
+                    waiting = true;
+                    if (std::chrono::steady_clock::now() - slot.fullSince >= kRetryAfter) {
+                        slot.full = false;
+                        slot.flushing = true;
+                        due.push_back(id);
+                    }
+                }
+            }
+            if (!due.empty()) {
+                lock.unlock();
+                for (short id : due) {
+                    Flush(controller, id);
+                }
+                lock.lock();
+                continue;
+            }
+            if (waiting) {
+                wake_.wait_for(lock, kRetryAfter / 2);
+            } else {
+                wake_.wait(lock);
+            }
+        }
+    }
+
+    std::condition_variable wake_;
+    bool stopping_ = false;
+    std::thread retrier_;
 };
 
 Router& RouterOf(ControllerModel& controller) { return controller.Shared<Router>(); }
+
+void MarkFull(Slot& slot) {
+    if (!slot.full) {
+        slot.fullSince = std::chrono::steady_clock::now();
+    }
+    slot.full = true;
+}
 
 HRESULT Deliver(ControllerModel& controller, std::uint32_t owner, TavIPCHeaderInternal header, const byte* data,
                 LONG size) {
@@ -77,8 +149,8 @@ HRESULT Deliver(ControllerModel& controller, std::uint32_t owner, TavIPCHeaderIn
     return sink->OnMessage(&header, const_cast<byte*>(data), size);
 }
 
-// Hands the messages held for a slot over while its owner has room; one
-// flusher at a time keeps them in order.
+// Hands the messages held for a slot over while its owner has room; the one
+// who set `flushing` does it.
 void Flush(ControllerModel& controller, short slotId) {
     Router& router = RouterOf(controller);
     for (;;) {
@@ -97,11 +169,25 @@ void Flush(ControllerModel& controller, short slotId) {
             slot->held.pop_front();
             owner = slot->owner;
         }
-        Deliver(controller, owner, message.header, message.body.data(), static_cast<LONG>(message.body.size()));
+        const HRESULT hr =
+            Deliver(controller, owner, message.header, message.body.data(), static_cast<LONG>(message.body.size()));
+        if (hr == kStatusQueueFull) {
+            std::lock_guard lock(router.mutex);
+            if (Slot* slot = router.Find(slotId)) {
+                slot->held.push_front(std::move(message));
+                MarkFull(*slot);
+                slot->flushing = false;
+            }
+            router.RetryLater(controller);
+            return;
+        }
     }
 }
 
-// Decides the route of one message to `slotId`; under the router's lock.
+// Takes one message for `slotId` in; under the router's lock. Messages reach
+// a slot's owner one at a time, in order, by whoever finds nobody handing
+// them over (`route.deliver`): so the owner's reports of a full queue take
+// effect before the next message goes out, and a queue never overflows.
 HRESULT Admit(Router& router, short slotId, const TavIPCHeaderInternal& header, const byte* data, LONG size,
               Route& route, Text& error) {
     Slot* slot = router.Find(slotId);
@@ -114,16 +200,14 @@ HRESULT Admit(Router& router, short slotId, const TavIPCHeaderInternal& header, 
                         slot->name, OLESTR(" takes ("), Decimal(slot->maxSize), OLESTR(")")});
         return kStatusBadArgument;
     }
-    route.owner = slot->owner;
-    if (!slot->full && slot->held.empty() && !slot->flushing) {
-        route.deliver = true;
-        return S_OK;
-    }
     if (slot->held.size() >= kHeldPerSlot) {
         error = Concat({OLESTR("SendIPCMessage: the queue of slot "), slot->name, OLESTR(" is full")});
         return kStatusQueueFull;
     }
     slot->held.push_back(Message{header, std::vector<byte>(data, data + size)});
+    route.owner = slot->owner;
+    route.deliver = !slot->full && !slot->flushing;
+    slot->flushing = slot->flushing || route.deliver;
     return S_OK;
 }
 
@@ -219,12 +303,18 @@ Reply QueueStatus(ControllerModel& controller, const Command& command) {
         if (slot == nullptr || slot->owner != command.caller.clientId) {
             return Refuse(kStatusNotFound, OLESTR("QueueStatus: the client owns no slot ") + Decimal(id));
         }
-        slot->full = arguments->Has(OLESTR("-QFull"));
+        if (arguments->Has(OLESTR("-QFull"))) {
+            MarkFull(*slot);
+        } else {
+            slot->full = false;
+        }
         flush = !slot->full && !slot->held.empty() && !slot->flushing;
         slot->flushing = slot->flushing || flush;
     }
     if (flush) {
         Flush(controller, id);
+    } else {
+        router.RetryLater(controller);
     }
     return Done();
 }
@@ -311,7 +401,7 @@ HRESULT RouteMessage(ControllerModel& controller, const Caller& caller, const Ta
         }
     }
     if (route.deliver) {
-        Deliver(controller, route.owner, sent, data, size);
+        Flush(controller, target);
     }
     return S_OK;
 }

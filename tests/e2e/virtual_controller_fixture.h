@@ -55,8 +55,10 @@ protected:
     }
 
     OleString Url() const { return text::Widen(url_); }
-    std::string LastError() {
-        ComPtr<ITavHelperBase> helper = As<ITavHelperBase>();
+    std::string LastError() { return LastErrorOf(controller_); }
+    static std::string LastErrorOf(const ComPtr<ITavController>& object) {
+        ComPtr<ITavHelperBase> helper;
+        EXPECT_EQ(object.As(helper), S_OK);
         Bstr text;
         helper->GetLastErrorInfo(text.Receive());
         return text::Narrow(text.View());
