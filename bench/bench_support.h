@@ -1,7 +1,8 @@
 #pragma once
 // What the end-to-end benchmarks share: a client process set up as a real
 // one is (COM, the virtual controller registered in-process, a controller
-// object from the module's class object, initialised).
+// object from the module's class object, initialised). The class decides
+// which interfaces the object answers: the later ones need a later class.
 #include "TavController.h"
 #include "median_reporter.h"
 #include "module/server_exports.h"
@@ -14,14 +15,14 @@ namespace tav::bench {
 
 class Client {
 public:
-    Client() {
+    explicit Client(const CLSID& classId = CLSID_TavController) {
         simulator_ = sim::RegisterInProcess();
         if (!simulator_) {
             failure_ = "cannot register the virtual controller";
             return;
         }
         ComPtr<IClassFactory> factory;
-        if (FAILED(DllGetClassObject(CLSID_TavController, IID_PPV_ARGS(&factory))) ||
+        if (FAILED(DllGetClassObject(classId, IID_PPV_ARGS(&factory))) ||
             FAILED(factory->CreateInstance(nullptr, IID_PPV_ARGS(&controller_)))) {
             failure_ = "cannot create a TavController object";
             return;

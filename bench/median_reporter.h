@@ -1,7 +1,7 @@
 #pragma once
-// A console reporter that keeps each benchmark's median CPU time, so that a
-// benchmark can close with a table of ratios against its baseline, with or
-// without repetitions, and when only aggregates are reported.
+// A console reporter that keeps each benchmark's median CPU and real time,
+// so that a benchmark can close with a table of ratios against its baseline,
+// with or without repetitions, and when only aggregates are reported.
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
@@ -25,18 +25,33 @@ public:
                 continue;
             }
             const std::string& args = run.run_name.args;
-            Timings& timings = timings_[run.run_name.function_name + (args.empty() ? "" : "/" + args)];
+            const std::string name = run.run_name.function_name + (args.empty() ? "" : "/" + args);
+            Timings& cpu = cpu_[name];
+            Timings& real = real_[name];
             if (run.run_type == Run::RT_Iteration) {
-                timings.repetitions.push_back(run.GetAdjustedCPUTime());
+                cpu.repetitions.push_back(run.GetAdjustedCPUTime());
+                real.repetitions.push_back(run.GetAdjustedRealTime());
             } else if (run.aggregate_name == "median") {
-                timings.median = run.GetAdjustedCPUTime();
+                cpu.median = run.GetAdjustedCPUTime();
+                real.median = run.GetAdjustedRealTime();
             }
         }
     }
 
 public:
-    double Median(const std::string& name) {
-        Timings& timings = timings_[name];
+    double Median(const std::string& name) { return MedianOf(cpu_[name]); }
+
+    // The same for wall-clock time, for work spread over several threads,
+    // which the calling thread's CPU time does not cover.
+    double MedianRealTime(const std::string& name) { return MedianOf(real_[name]); }
+
+private:
+    struct Timings {
+        std::vector<double> repetitions;
+        double median = 0;
+    };
+
+    static double MedianOf(Timings& timings) {
         if (timings.median > 0 || timings.repetitions.empty()) {
             return timings.median;
         }
@@ -45,12 +60,8 @@ public:
         return all[all.size() / 2];
     }
 
-private:
-    struct Timings {
-        std::vector<double> repetitions;
-        double median = 0;
-    };
-    std::map<std::string, Timings> timings_;
+    std::map<std::string, Timings> cpu_;
+    std::map<std::string, Timings> real_;
 };
 
 }  // namespace tav::bench
