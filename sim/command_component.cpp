@@ -142,6 +142,7 @@ std::shared_ptr<ControllerModel> CommandComponent::Reach(TextView url) {
             return controller;
         }
         bound_ = controller;
+        boundDirect_.store(controller.get(), std::memory_order_release);
     }
     clientId_ = controller->ConnectClient(OLESTR("TavController"));
     LinkMessageSink();
@@ -180,18 +181,25 @@ HRESULT CommandComponent::Carry(TavInParams* rip, TavCommandReply* reply, TextVi
         return Fail(E_POINTER, where() + OLESTR(": no reply record"));
     }
     Command request{verb, ViewOf(command), ViewOf(args), ViewOf(url)};
-    const auto controller = Reach(request.url);
-    request.caller = Caller{clientId_.load(std::memory_order_relaxed), clientValue};
-    if (!controller) {
-        return Fail(E_INVALIDARG, where() + OLESTR(": no controller at URL ") + Quoted(request.url));
+    // The bound controller is reached without the registry: controllers live
+    // as long as the process, so the plain pointer stays good.
+    ControllerModel* bound = boundDirect_.load(std::memory_order_acquire);
+    std::shared_ptr<ControllerModel> controller;
+    if (bound == nullptr || ControllerUrlOf(request.url) != TextView(bound->Url())) {
+        controller = Reach(request.url);
+        if (!controller) {
+            return Fail(E_INVALIDARG, where() + OLESTR(": no controller at URL ") + Quoted(request.url));
+        }
+        bound = controller.get();
     }
-    if (auto down = controller->Faults().Transport()) {
+    request.caller = Caller{clientId_.load(std::memory_order_relaxed), clientValue};
+    if (auto down = bound->Faults().Transport()) {
         return Fail(down->status, std::move(down->text));
     }
     const ULONG timeOut = rip == nullptr ? 0 : rip->timeOut;
 
     if (rip == nullptr || rip->callType == Sync) {
-        const auto result = RunCommand(*controller, request, timeOut, [](std::chrono::milliseconds delay) {
+        const auto result = RunCommand(*bound, request, timeOut, [](std::chrono::milliseconds delay) {
             std::this_thread::sleep_for(delay);
             return true;
         });
@@ -199,6 +207,9 @@ HRESULT CommandComponent::Carry(TavInParams* rip, TavCommandReply* reply, TextVi
             return Fail(E_OUTOFMEMORY, where() + OLESTR(": no memory for the reply"));
         }
         return S_OK;
+    }
+    if (!controller) {
+        controller = Reach(request.url);
     }
 
     const ComPtr<ITavCommandCallback> callback = CallbackOf(*rip);

@@ -90,6 +90,7 @@ private:
     std::mutex mutex_;
     LastError lastError_;
     std::shared_ptr<ControllerModel> bound_;
+    std::atomic<ControllerModel*> boundDirect_{nullptr};
     std::atomic<std::uint32_t> clientId_{0};
     std::shared_ptr<SubscriptionHub> hub_;
     ComPtr<_ITavIPCMessages> messageSink_;

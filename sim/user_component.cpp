@@ -276,7 +276,7 @@ HRESULT UserComponent::UnpackManualModePrivilegesState(VARIANT* data, ULONG clie
             return Fail(E_OUTOFMEMORY, Concat({kComponent, operation, OLESTR(": out of memory")}));
         }
         *state = static_cast<TavManualModePrivilegesState>(*value);
-        *thisIsMe = *cid != 0 && *cid == clientId ? 1 : 0;
+        *thisIsMe = cid.value_or(0) != 0 && cid.value_or(0) == clientId ? 1 : 0;
         return S_OK;
     });
 }
@@ -435,7 +435,7 @@ HRESULT UserComponent::UnpackCurrentMaster(VARIANT* data, ULONG cid, TavMastersh
             return Fail(E_OUTOFMEMORY, Concat({kComponent, operation, OLESTR(": out of memory")}));
         }
         *status = static_cast<TavMastershipStatus>(*value);
-        *thisIsMe = *holder != 0 && *holder == cid ? 1 : 0;
+        *thisIsMe = holder.value_or(0) != 0 && holder.value_or(0) == cid ? 1 : 0;
         return S_OK;
     });
 }

@@ -53,7 +53,7 @@ void Flush(ControllerModel& controller, short slotId);
 
 class Router {
 public:
-    Router() { slots_[kEchoSlot] = Slot{kEchoSlotName, 0, 0, 200, static_cast<short>(kMaxBodySize)}; }
+    Router();
     ~Router() {
         {
             std::lock_guard lock(mutex);
@@ -70,7 +70,8 @@ public:
     // stays full with messages held is offered its next message again after
     // a while. A client that has no room refuses it and it stays held.
     void RetryLater(ControllerModel& controller) {
-        if (!retrier_.joinable()) {
+        std::lock_guard lock(mutex);
+        if (!retrier_.joinable() && !stopping_) {
             retrier_ = std::thread([this, &controller] { Retry(controller); });
         }
         wake_.notify_all();
@@ -131,6 +132,18 @@ private:
     std::thread retrier_;
 };
 
+Slot NewSlot(TextView name, std::uint32_t owner, short proxy, short maxMsg, short maxSize) {
+    Slot slot;
+    slot.name = Text(name);
+    slot.owner = owner;
+    slot.proxy = proxy;
+    slot.maxMsg = maxMsg;
+    slot.maxSize = maxSize;
+    return slot;
+}
+
+Router::Router() { slots_[kEchoSlot] = NewSlot(kEchoSlotName, 0, 0, 200, static_cast<short>(kMaxBodySize)); }
+
 Router& RouterOf(ControllerModel& controller) { return controller.Shared<Router>(); }
 
 void MarkFull(Slot& slot) {
@@ -178,6 +191,8 @@ void Flush(ControllerModel& controller, short slotId) {
                 MarkFull(*slot);
                 slot->flushing = false;
             }
+        }
+        if (hr == kStatusQueueFull) {
             router.RetryLater(controller);
             return;
         }
@@ -244,7 +259,9 @@ Reply Connect(ControllerModel& controller, const Command& command) {
         return Refuse(kStatusBadArgument,
                       OLESTR("Connect: expected -Name <slot> -MaxMsg <n> -MaxSize <n>, got ") + Quoted(command.args));
     }
-    if (*maxMsg < 1 || *maxMsg > 32767 || *maxSize < 1 || *maxSize > kMaxBodySize) {
+    const std::int32_t messages = *maxMsg;
+    const std::int32_t size = *maxSize;
+    if (messages < 1 || messages > 32767 || size < 1 || size > kMaxBodySize) {
         return Refuse(kStatusBadArgument, Concat({OLESTR("Connect: a slot holds 1 to 32767 messages of 1 to "),
                                                   Decimal(kMaxBodySize), OLESTR(" bytes")}));
     }
@@ -264,10 +281,10 @@ Reply Connect(ControllerModel& controller, const Command& command) {
         }
     }
     const short id = router.NewId();
-    router.slots_[id] = Slot{Text(*name), command.caller.clientId, proxy->second, static_cast<short>(*maxMsg),
-                             static_cast<short>(*maxSize)};
+    router.slots_[id] = NewSlot(*name, command.caller.clientId, proxy->second, static_cast<short>(messages),
+                                static_cast<short>(size));
     return Answer(Concat({SlotReply(id, proxy->second), OLESTR(" -name "), *name, OLESTR(" -MaxMsg "),
-                          Decimal(*maxMsg), OLESTR(" -MaxSize "), Decimal(*maxSize)}));
+                          Decimal(messages), OLESTR(" -MaxSize "), Decimal(size)}));
 }
 
 Reply Disconnect(ControllerModel& controller, const Command& command) {
@@ -402,6 +419,8 @@ HRESULT RouteMessage(ControllerModel& controller, const Caller& caller, const Ta
     }
     if (route.deliver) {
         Flush(controller, target);
+    } else {
+        router.RetryLater(controller);
     }
     return S_OK;
 }

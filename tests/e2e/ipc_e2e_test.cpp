@@ -161,5 +161,34 @@ TEST_F(IpcEndToEndTest, ConcurrentSendersLoseNothing) {
     }
 }
 
+TEST_F(IpcEndToEndTest, AFastProducerLosesNothingAndKeepsItsOrder) {
+    ComPtr<ITavController> other;
+    ASSERT_EQ(Make(17, other), S_OK);
+    ComPtr<ITavIPC> receiver = As<ITavIPC>();
+    ComPtr<ITavIPC> sender;
+    ASSERT_EQ(other.As(sender), S_OK);
+    for (short queue : {short{3}, short{199}}) {
+        const short slot = Connect(receiver.Get(), queue == 3 ? "small" : "large", queue);
+        constexpr int kMessages = 5000;
+        std::thread producer([&] {
+            // The controller holds a bounded number for a full slot and
+            // refuses more; the sender tries again.
+            for (int i = 0; i < kMessages; ++i) {
+                HRESULT hr;
+                while ((hr = Send(sender.Get(), 0, slot, std::to_string(i))) == static_cast<HRESULT>(0xC0040404)) {
+                    std::this_thread::yield();
+                }
+                ASSERT_EQ(hr, S_OK);
+            }
+        });
+        for (int i = 0; i < kMessages; ++i) {
+            std::string body;
+            ASSERT_EQ(Receive(receiver.Get(), slot, body, nullptr, 5000), S_OK) << "queue " << queue << " at " << i;
+            ASSERT_EQ(body, std::to_string(i));
+        }
+        producer.join();
+    }
+}
+
 }  // namespace
 }  // namespace tav::e2e
