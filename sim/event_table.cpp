@@ -6,7 +6,10 @@
 namespace tav::sim {
 namespace {
 
-// The connection's own events belong to the link, not to a subsystem.
+// The connection's own events belong to the link, not to a subsystem:
+// "-Connection established" (or "-Connection lost" if the link is down) to
+// each new subscriber, then "-Connection lost" and "-Connection restored" as
+// the link goes and comes back.
 constexpr EventRow kConnectionEvent{ControllerModel::kConnectionEvent, EventStyle::Pulse, nullptr};
 
 }  // namespace
@@ -23,6 +26,13 @@ const EventRow* FindEvent(TextView name) {
         }
     }
     return nullptr;
+}
+
+std::optional<Text> GreetingOf(const EventRow& event, ControllerModel& controller) {
+    if (&event == &kConnectionEvent) {
+        return Text(controller.Faults().Transport() ? OLESTR("-Connection lost") : OLESTR("-Connection established"));
+    }
+    return std::nullopt;
 }
 
 }  // namespace tav::sim

@@ -1,4 +1,6 @@
 #pragma once
+#include <optional>
+
 #include "sim/arguments.h"
 #include "sim/model_state.h"
 
@@ -21,5 +23,11 @@ struct EventRow {
 
 // NULL for an event the controller does not know.
 const EventRow* FindEvent(TextView name);
+
+class ControllerModel;
+
+// What a new subscriber of a pulse event is told at once, before any post:
+// the state it joins in (the link up or down). Empty for most events.
+std::optional<Text> GreetingOf(const EventRow& event, ControllerModel& controller);
 
 }  // namespace tav::sim

@@ -25,6 +25,23 @@ FILETIME FileTimeOf(std::uint32_t seconds) {
     return time;
 }
 
+// BinaryData carries the text as bytes, one per character (Latin-1, as the
+// controller's texts are), in a byte-length BSTR: SysStringByteLen is the
+// text's length and no terminating wide character is implied.
+HRESULT BinaryPayload(TextView text, Variant& payload) {
+    std::string bytes(text.size(), '\0');
+    std::transform(text.begin(), text.end(), bytes.begin(),
+                   [](OLECHAR c) { return static_cast<char>(c <= 0xFF ? c : '?'); });
+    BSTR data = SysAllocStringByteLen(bytes.data(), static_cast<UINT>(bytes.size()));
+    if (data == nullptr) {
+        return E_OUTOFMEMORY;
+    }
+    Bstr owned;
+    owned.Attach(data);
+    payload.SetBstr(std::move(owned));
+    return S_OK;
+}
+
 }  // namespace
 
 struct SubscriptionHub::Subscription {
@@ -53,6 +70,11 @@ ULONG SubscriptionHub::Add(SubscriptionRequest request) {
         subscription.lastQueued = controller_->Read(
             [&](const ModelState& state) { return request.event->current(state, request.eventArgs); });
     }
+    if (auto greeting = GreetingOf(*request.event, *controller_)) {
+        subscription.queued.push_back(std::move(*greeting));
+    }
+    // A forced poll time (and 0) means on change only: never looked at on
+    // a timer, only right after each change.
     if (request.pollTime != 0 && request.pollTime < kNeverPolled) {
         subscription.period = std::max(kShortestPoll, std::chrono::milliseconds(request.pollTime));
         subscription.nextPoll = Clock::now() + *subscription.period;
@@ -236,7 +258,13 @@ Clock::time_point SubscriptionHub::NextPoll() const {
 
 void SubscriptionHub::Send(Delivery& delivery, TextView text) {
     Variant payload;
-    if (delivery.containData != NoData && FAILED(payload.SetString(text))) {
+    HRESULT filled = S_OK;
+    if (delivery.containData == BinaryData) {
+        filled = BinaryPayload(text, payload);
+    } else if (delivery.containData != NoData) {
+        filled = payload.SetString(text);
+    }
+    if (FAILED(filled)) {
         return;  // no memory for the text: this event is lost, as on a congested link
     }
     TavEventData event{};

@@ -5,6 +5,7 @@
 #include "sim/command_table.h"
 #include "sim/reply_texts.h"
 #include "sim/status_codes.h"
+#include "sim/subsystems/pin_lock.h"
 
 namespace tav::sim {
 namespace {
@@ -34,7 +35,8 @@ Reply GetSystemStartupClock(ControllerModel& controller, const Command&) {
 }
 
 // Every mode boots the system again: motors off, a pending mode change
-// dropped, the start-up clock reset.
+// dropped, a plain PIN lock lifted and a pending permanent one made
+// permanent, the start-up clock reset.
 Reply SetRestart(ControllerModel& controller, const Command& command) {
     const TextView mode = Trim(command.args);
     bool known = false;
@@ -54,6 +56,7 @@ Reply SetRestart(ControllerModel& controller, const Command& command) {
             state.mode = state.modeBeforeChange;
         }
         state.pendingConditions.clear();
+        RestartPinLock(state);
     });
     return Done();
 }

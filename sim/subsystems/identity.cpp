@@ -1,5 +1,5 @@
 // Identity, names, version information, environment, options, language,
-// connected clients and energy state.
+// connected clients.
 #include "sim/arguments.h"
 #include "sim/command_table.h"
 #include "sim/reply_texts.h"
@@ -132,10 +132,6 @@ Reply GetConnectedClients(ControllerModel& controller, const Command&) {
     return Answer(controller.Read([](const ModelState& state) { return ConnectedClientsXml(state); }));
 }
 
-Reply GetSysEnergyState(ControllerModel& controller, const Command&) {
-    return Answer(OLESTR("-sysenergy ") + controller.Read([](const ModelState& state) { return state.energy; }));
-}
-
 // The version name follows "-Name " without quotes, up to the end.
 Reply GetVersionName(ControllerModel& controller, const Command&) {
     return Answer(OLESTR("-Name ") + controller.Read([](const ModelState& state) { return state.versionName; }));
@@ -167,7 +163,6 @@ constexpr CommandRow kRows[] = {
     {OLESTR("Get"), OLESTR("IsOptionPresent"), IsOptionPresent},
     {OLESTR("Set"), OLESTR("Language"), SetLanguage},
     {OLESTR("Get"), OLESTR("ConnectedClients"), GetConnectedClients},
-    {OLESTR("Get"), OLESTR("SysEnergyState"), GetSysEnergyState},
     {OLESTR("Get"), OLESTR("VersionName"), GetVersionName},
     {OLESTR("Get"), OLESTR("ProductVersionName"), GetProductVersionName},
 };

@@ -1,11 +1,13 @@
 // Operating panel: motors state, operation mode, auto conditions,
-// acknowledgements and collision detection.
+// acknowledgements and collision detection. The speed ratio and the PIN lock
+// of the mode selector have files of their own.
 #include <algorithm>
 
 #include "sim/arguments.h"
 #include "sim/command_table.h"
 #include "sim/reply_texts.h"
 #include "sim/status_codes.h"
+#include "sim/subsystems/pin_lock.h"
 
 namespace tav::sim {
 namespace {
@@ -93,7 +95,10 @@ Reply SetOperationMode(ControllerModel& controller, const Command& command) {
     if (!mode || (*mode != OLESTR("auto") && *mode != OLESTR("manr") && *mode != OLESTR("manf"))) {
         return Refuse(kStatusBadArgument, OLESTR("OPMode: expected -opmode auto|manr|manf, got ") + Quoted(command.args));
     }
-    controller.Update([&](ModelState& state, EventPosts&) {
+    return controller.Update([&](ModelState& state, EventPosts&) {
+        if (ModeIsLocked(state)) {
+            return Refuse(kStatusNotAllowed, OLESTR("OPMode: the operation mode is locked by a PIN code"));
+        }
         if (*mode == OLESTR("manr")) {
             EnterMode(state, OperationMode::Manr);
         } else if (*mode == OLESTR("manf")) {
@@ -105,8 +110,8 @@ Reply SetOperationMode(ControllerModel& controller, const Command& command) {
             state.pendingConditions = state.autoConditions;
             state.answers.clear();
         }
+        return Done();
     });
-    return Done();
 }
 
 Reply SetAcknowledge(ControllerModel& controller, const Command& command) {

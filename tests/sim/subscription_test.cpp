@@ -144,9 +144,10 @@ TEST_F(SubscriptionTest, ConnectionEventsTellWhenTheLinkGoesAndReturns) {
     controller_->Faults().FailTransport();
     controller_->Faults().FailTransport();  // already down: no second notice
     controller_->Faults().RestoreTransport();
-    ASSERT_TRUE(sink->WaitFor(2));
-    EXPECT_EQ((std::vector<std::string>{"-Connection lost", "-Connection restored"}), sink->Texts());
-    EXPECT_FALSE(sink->WaitFor(3, 100ms));
+    ASSERT_TRUE(sink->WaitFor(3));
+    EXPECT_EQ((std::vector<std::string>{"-Connection established", "-Connection lost", "-Connection restored"}),
+              sink->Texts());
+    EXPECT_FALSE(sink->WaitFor(4, 100ms));
 }
 
 TEST_F(SubscriptionTest, ReleasingTheComponentEndsItsSubscriptions) {

@@ -1,0 +1,55 @@
+// Speed ratio: the program speed override, in percent.
+#include "sim/arguments.h"
+#include "sim/command_table.h"
+#include "sim/status_codes.h"
+
+namespace tav::sim {
+namespace {
+
+struct SpeedState {
+    std::int16_t ratio = 100;
+};
+
+// The reply is the bare number, without a key.
+Text RatioText(const ModelState& state) { return Decimal(state.Part<SpeedState>().ratio); }
+
+Reply GetSpeedRatio(ControllerModel& controller, const Command&) {
+    return Answer(controller.Read([](const ModelState& state) { return RatioText(state); }));
+}
+
+Reply SetSpeedRatio(ControllerModel& controller, const Command& command) {
+    const auto arguments = Arguments::Parse(command.args);
+    const auto ratio = arguments ? arguments->Signed(OLESTR("-Value")) : std::nullopt;
+    if (!ratio) {
+        return Refuse(kStatusBadArgument, OLESTR("SpeedAdjust: expected -Value <0 to 100>, got ") + Quoted(command.args));
+    }
+    if (*ratio < 0 || *ratio > 100) {
+        return Refuse(kStatusBadArgument,
+                      OLESTR("SpeedAdjust: the speed ratio ") + Decimal(*ratio) + OLESTR(" is outside 0 to 100"));
+    }
+    controller.Update([&](ModelState& state, EventPosts&) {
+        state.Part<SpeedState>().ratio = static_cast<std::int16_t>(*ratio);
+    });
+    return Done();
+}
+
+constexpr CommandRow kRows[] = {
+    {OLESTR("Get"), OLESTR("SpeedAdjust"), GetSpeedRatio},
+    {OLESTR("Set"), OLESTR("SpeedAdjust"), SetSpeedRatio},
+};
+
+// "SpeedAdjust": the same bare number as the Get reply ("75").
+Text SpeedEvent(const ModelState& state, const Arguments&) { return RatioText(state); }
+
+constexpr EventRow kEvents[] = {
+    {OLESTR("SpeedAdjust"), EventStyle::Value, SpeedEvent},
+};
+
+}  // namespace
+
+const Subsystem& SpeedSubsystem() {
+    static constexpr Subsystem subsystem{kRows, kEvents};
+    return subsystem;
+}
+
+}  // namespace tav::sim

@@ -1,0 +1,104 @@
+// The virtual clock end to end: its states, stepping by slices and to the
+// next slice boundary, free running at a speed, and what it refuses.
+#include <thread>
+
+#include "events_fixture.h"
+#include "sim/status_codes.h"
+
+namespace tav::e2e {
+namespace {
+
+using namespace std::chrono_literals;
+
+class VirtualTimeE2eTest : public EventsFixture {
+protected:
+    ComPtr<ITavVirtualTime> Clock() { return As<ITavVirtualTime>(); }
+    ULONG Time() {
+        ULONG time = 0;
+        EXPECT_EQ(Clock()->VTGetTime(nullptr, &time), S_OK);
+        return time;
+    }
+};
+
+TEST_F(VirtualTimeE2eTest, StartsStoppedAtZero) {
+    TavVTState state = VTFreeRun;
+    ULONG slice = 0;
+    ULONG speed = 0;
+    ASSERT_EQ(Clock()->VTGetState(nullptr, &state), S_OK);
+    ASSERT_EQ(Clock()->VTGetTimeSlice(nullptr, &slice), S_OK);
+    ASSERT_EQ(Clock()->VTGetSpeed(nullptr, &speed), S_OK);
+    EXPECT_EQ(state, VTStop);
+    EXPECT_EQ(slice, 24u);
+    EXPECT_EQ(speed, 100u);
+    EXPECT_EQ(Time(), 0u);
+}
+
+TEST_F(VirtualTimeE2eTest, EveryStateReadsBackAsSet) {
+    for (TavVTState state : {VTFreeRun, VTRunSlice, VTNextEvent, VTStop}) {
+        ASSERT_EQ(Clock()->VTSetState(nullptr, state), S_OK);
+        TavVTState read = static_cast<TavVTState>(-1);
+        ASSERT_EQ(Clock()->VTGetState(nullptr, &read), S_OK);
+        EXPECT_EQ(read, state);
+    }
+}
+
+TEST_F(VirtualTimeE2eTest, SteppingMovesBySliceOrToTheNextBoundary) {
+    struct Step {
+        TavVTState state;
+        ULONG slice;
+        ULONG timeAfterRun;
+    };
+    const Step steps[] = {
+        {VTRunSlice, 24, 24}, {VTRunSlice, 10, 34},  // a slice from where it stands
+        {VTNextEvent, 10, 40}, {VTNextEvent, 10, 50},  // to the boundary, then a whole slice
+        {VTNextEvent, 15, 60}, {VTRunSlice, 1000, 1060},
+    };
+    for (const Step& step : steps) {
+        SCOPED_TRACE(step.timeAfterRun);
+        ASSERT_EQ(Clock()->VTSetState(nullptr, step.state), S_OK);
+        ASSERT_EQ(Clock()->VTSetTimeSlice(nullptr, step.slice), S_OK);
+        ASSERT_EQ(Clock()->VTRun(nullptr), S_OK) << LastError();
+        EXPECT_EQ(Time(), step.timeAfterRun);
+    }
+}
+
+TEST_F(VirtualTimeE2eTest, RefusesWhatWouldNotAdvanceTheClock) {
+    EXPECT_EQ(Clock()->VTRun(nullptr), sim::kStatusNotAllowed);  // stopped
+    EXPECT_NE(LastError().find("stopped"), std::string::npos) << LastError();
+    ASSERT_EQ(Clock()->VTSetState(nullptr, VTFreeRun), S_OK);
+    EXPECT_EQ(Clock()->VTRun(nullptr), sim::kStatusNotAllowed);
+    EXPECT_NE(LastError().find("runs freely"), std::string::npos) << LastError();
+    EXPECT_EQ(Clock()->VTSetTimeSlice(nullptr, 0), sim::kStatusBadArgument);
+    ULONG slice = 0;
+    ASSERT_EQ(Clock()->VTGetTimeSlice(nullptr, &slice), S_OK);
+    EXPECT_EQ(slice, 24u);
+}
+
+TEST_F(VirtualTimeE2eTest, FreeRunningFollowsTheHostAtItsSpeed) {
+    ASSERT_EQ(Clock()->VTSetSpeed(nullptr, 1000), S_OK);
+    ULONG speed = 0;
+    ASSERT_EQ(Clock()->VTGetSpeed(nullptr, &speed), S_OK);
+    EXPECT_EQ(speed, 1000u);
+
+    ASSERT_EQ(Clock()->VTSetState(nullptr, VTFreeRun), S_OK);
+    std::this_thread::sleep_for(60ms);
+    const ULONG running = Time();
+    EXPECT_GE(running, 600u);  // ten times the host's 60 ms at least
+
+    ASSERT_EQ(Clock()->VTSetSpeed(nullptr, 0), S_OK);  // a speed of 0 holds it
+    const ULONG held = Time();
+    EXPECT_GE(held, running);
+    std::this_thread::sleep_for(30ms);
+    EXPECT_EQ(Time(), held);
+
+    ASSERT_EQ(Clock()->VTSetSpeed(nullptr, 100), S_OK);
+    std::this_thread::sleep_for(30ms);
+    ASSERT_EQ(Clock()->VTSetState(nullptr, VTStop), S_OK);
+    const ULONG stopped = Time();
+    EXPECT_GE(stopped, held + 30);
+    std::this_thread::sleep_for(30ms);
+    EXPECT_EQ(Time(), stopped);  // stopping keeps the time reached
+}
+
+}  // namespace
+}  // namespace tav::e2e
