@@ -58,21 +58,6 @@ TEST_F(EventRecordE2eTest, DataComesInTheFormAskedFor) {
     EXPECT_EQ(Panel()->UnpackSpeedRatio(sinks[1]->All()[0].data->Get(), &ratio), E_FAIL);
 }
 
-TEST_F(EventRecordE2eTest, EachEventHasItsOwnIdentifierInOrder) {
-    SinkRef sink;
-    ULONG cookie = 0;
-    ASSERT_EQ(Subscribe(sink.sink, SpeedRatio, &cookie), S_OK);
-    for (short ratio : {10, 20, 30}) {
-        ASSERT_EQ(Panel()->SetSpeedRatio(nullptr, ratio), S_OK);
-    }
-    ASSERT_TRUE(sink->WaitFor(3));
-    const auto events = sink->All();
-    EXPECT_LT(events[0].eventId, events[1].eventId);
-    EXPECT_LT(events[1].eventId, events[2].eventId);
-    EXPECT_EQ(events[2].text, "30");
-    EXPECT_EQ(Unsubscribe(cookie), S_OK);
-}
-
 // A forced poll time must not stop the changes themselves from arriving:
 // the auto conditions come on change only, whatever poll time is asked for.
 TEST_F(EventRecordE2eTest, ForcedPollTimeStillDeliversEveryChange) {
