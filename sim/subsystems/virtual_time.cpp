@@ -58,8 +58,8 @@ void Rebase(VirtualTimeState& clock) {
 Text TimeText(std::uint64_t time) { return OLESTR("-time ") + Decimal(static_cast<std::uint32_t>(time)); }
 
 Reply BadArguments(const Command& command, TextView expected) {
-    return Refuse(kStatusBadArgument,
-                  Text(command.name) + OLESTR(": expected ") + Text(expected) + OLESTR(", got ") + Quoted(command.args));
+    return Refuse(kStatusBadArgument, Text(command.name) + OLESTR(": expected ") + Text(expected) + OLESTR(", got ") +
+                                          Quoted(command.args));
 }
 
 std::optional<std::uint32_t> ValueOf(const Command& command, TextView key) {

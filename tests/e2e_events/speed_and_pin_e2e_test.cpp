@@ -18,7 +18,9 @@ TEST_F(SpeedAndPinE2eTest, SpeedRatioKeepsTheLastAcceptedValue) {
         HRESULT hr;
         short after;
     };
-    const Step steps[] = {{0, S_OK, 0}, {100, S_OK, 100}, {55, S_OK, 55}, {101, E_INVALIDARG, 55}, {-1, E_INVALIDARG, 55}};
+    const Step steps[] = {
+        {0, S_OK, 0}, {100, S_OK, 100}, {55, S_OK, 55}, {101, E_INVALIDARG, 55}, {-1, E_INVALIDARG, 55},
+    };
     for (const Step& step : steps) {
         SCOPED_TRACE(step.ratio);
         EXPECT_EQ(Panel()->SetSpeedRatio(nullptr, step.ratio), step.hr);

@@ -29,7 +29,9 @@ std::string Number(HRESULT hr, long value) {
 
 const WatchedType kTypes[] = {
     {"state", state, 0,
-     [](EventsFixture& t, int step) { return t.Panel()->SetControllerState(nullptr, step == 0 ? MotorsOn : MotorsOff); },
+     [](EventsFixture& t, int step) {
+         return t.Panel()->SetControllerState(nullptr, step == 0 ? MotorsOn : MotorsOff);
+     },
      [](EventsFixture& t, VARIANT* data) {
          TavControllerState value{};
          const HRESULT hr = t.Panel()->UnpackControllerState(data, &value);
