@@ -1,6 +1,7 @@
 #include "sim/command_table.h"
 
 #include <algorithm>
+#include <unordered_map>
 #include <vector>
 
 #include "sim/status_codes.h"
@@ -16,34 +17,38 @@ Service ServiceOf(TextView url) {
     return Service::Controller;
 }
 
-// Every command row of every subsystem, sorted by name and verb once, so that
-// a command is found by a binary search whatever the number of subsystems.
+// Every command row of every subsystem by name, hashed once, so that a
+// command is found in one probe whatever the number of subsystems.
 class CommandIndex {
 public:
     CommandIndex() {
         for (const Subsystem* subsystem : Subsystems()) {
             for (const CommandRow& row : subsystem->commands) {
-                rows_.push_back(&row);
+                rows_[row.name].push_back(&row);
             }
         }
-        std::sort(rows_.begin(), rows_.end(), [](const CommandRow* a, const CommandRow* b) {
-            return a->name != b->name ? a->name < b->name : a->verb < b->verb;
-        });
     }
 
     // The rows of this name (both verbs), empty for an unknown name.
     std::span<const CommandRow* const> Named(TextView name) const {
-        const auto first = std::lower_bound(rows_.begin(), rows_.end(), name,
-                                            [](const CommandRow* row, TextView key) { return row->name < key; });
-        auto last = first;
-        while (last != rows_.end() && (*last)->name == name) {
-            ++last;
+        const auto found = rows_.find(name);
+        if (found == rows_.end()) {
+            return {};
         }
-        return {first, last};
+        return found->second;
     }
 
 private:
-    std::vector<const CommandRow*> rows_;
+    struct Hash {
+        std::size_t operator()(TextView text) const noexcept {
+            std::size_t hash = 14695981039346656037ull;
+            for (OLECHAR c : text) {
+                hash = (hash ^ static_cast<std::uint16_t>(c)) * 1099511628211ull;
+            }
+            return hash;
+        }
+    };
+    std::unordered_map<TextView, std::vector<const CommandRow*>, Hash> rows_;
 };
 
 const CommandIndex& Index() {
