@@ -81,6 +81,14 @@ public:
     TavIPCOutParams out{};
 };
 
+// A body holds the bytes as they were sent, not 16-bit text.
+Value BodyValue(BSTR body) {
+    if (body == nullptr) {
+        return Value::Null();
+    }
+    return Value::Text(std::string(reinterpret_cast<const char*>(body), SysStringByteLen(body)));
+}
+
 Record MessageRecord(const TavIPCOutParams& message) {
     return {{"type", Show(message.ipcParams.msgType)},
             {"did", Show(message.ipcParams.did)},
@@ -88,7 +96,7 @@ Record MessageRecord(const TavIPCOutParams& message) {
             {"cmd", Show(message.ipcParams.cmd)},
             {"userDef", Show(message.ipcParams.userDef)},
             {"userData", Show(message.ipcParams.userData)},
-            {"data", TextValue(message.Data)}};
+            {"data", BodyValue(message.Data)}};
 }
 
 int Receive(Verb& v) {
@@ -215,7 +223,7 @@ int Ping(Verb& v) {
         return times[std::min(times.size() - 1, static_cast<std::size_t>(p * static_cast<double>(times.size())))];
     };
     v.session.Show(Record{{"messages", Value::Unsigned(times.size())},
-                          {"perSecond", Value::Real(static_cast<double>(times.size()) / total)},
+                          {"perSecond", Value::Unsigned(static_cast<unsigned long long>(static_cast<double>(times.size()) / total))},
                           {"p50ms", Value{Value::Kind::Number, Milliseconds(percentile(0.50))}},
                           {"p90ms", Value{Value::Kind::Number, Milliseconds(percentile(0.90))}},
                           {"p99ms", Value{Value::Kind::Number, Milliseconds(percentile(0.99))}},

@@ -42,7 +42,10 @@ long Verb::EnumValue(const char* what, const std::string& word, std::span<const 
         *number <= static_cast<long double>(std::numeric_limits<LONG>::max())) {
         return static_cast<long>(*number);
     }
-    std::string known = aliases.empty() ? NameList(names) : NameList(aliases);
+    std::string known = NameList(names);
+    if (!aliases.empty()) {
+        known = NameList(aliases) + "; " + known;
+    }
     throw UsageError{"unknown " + std::string(what) + " " + Quote(word) + " (" + known + ", or a number)"};
 }
 
