@@ -32,7 +32,7 @@ name get
 clock set 2026-11-21T02:30:00Z
 clock get
 # Events are printed, time-stamped, as they arrive from the controller.
-watch start
+watch start --type state,mode
 state set MotorsOn
 watch wait --count 1 --timeout 5
 state get

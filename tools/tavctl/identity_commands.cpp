@@ -1,295 +1,149 @@
 // Identity, names, version information, environment, options, clients,
 // energy state, the file link and the last error.
-#include "tavctl/command_support.h"
-#include "tavctl/commands.h"
-#include "tavctl/names.h"
+#include "tavctl/verb.h"
 
 namespace tavctl {
 namespace {
 
-// "get" prints the text that read() produces; "set VALUE" writes it.
-int GetOrSet(Session& session, CommandArguments& args, const char* command,
-             HRESULT (ITavController::*get)(TavInParams*, BSTR*), HRESULT (ITavController::*unpack)(VARIANT*, BSTR*),
-             HRESULT (ITavController::*set)(TavInParams*, BSTR), const char* getName, const char* setName) {
-    int status = kExitOk;
-    const auto verb = Required(session, args, command, "get or set", status);
-    if (!verb) {
-        return status;
-    }
-    ITavController* controller = session.Controller();
-    if (*verb == "get") {
-        if (!NoMore(session, args, command, status)) {
-            return status;
-        }
-        tav::Bstr value;
-        return session.Read(
-            getName, [&](TavInParams* rip) { return (controller->*get)(rip, value.Receive()); },
-            [&](VARIANT* data) { return (controller->*unpack)(data, value.Receive()); },
-            [&] { session.Print(ToUtf8(value)); });
-    }
-    if (*verb == "set") {
-        const auto text = Required(session, args, command, "the new value", status);
-        if (!text || !NoMore(session, args, command, status)) {
-            return status;
-        }
-        const tav::Bstr value = ToBstr(*text);
-        return session.Write(setName, [&](TavInParams* rip) { return (controller->*set)(rip, value.Get()); });
-    }
-    return session.Usage(command, "expected get or set, not " + *verb);
-}
+using C = ITavController;
 
-int Name(Session& session, CommandArguments& args) {
-    return GetOrSet(session, args, "name", &ITavController::GetControllerName, &ITavController::UnpackControllerName,
-                    &ITavController::SetControllerName, "GetControllerName", "SetControllerName");
+int NameGet(Verb& v) {
+    v.End();
+    return v.Get("GetControllerName", &C::GetControllerName, &C::UnpackControllerName);
 }
-
-int Id(Session& session, CommandArguments& args) {
-    return GetOrSet(session, args, "id", &ITavController::GetControllerID, &ITavController::UnpackControllerID,
-                    &ITavController::SetControllerId, "GetControllerID", "SetControllerId");
+int NameSet(Verb& v) {
+    const auto name = v.Text("NAME");
+    v.End();
+    return v.Set("SetControllerName", &C::SetControllerName, name.Get());
 }
-
-int Language(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    const auto verb = Required(session, args, "language", "set", status);
-    if (!verb) {
-        return status;
-    }
-    if (*verb != "set") {
-        return session.Usage("language", "expected set, not " + *verb);
-    }
-    const auto text = Required(session, args, "language", "the language", status);
-    if (!text || !NoMore(session, args, "language", status)) {
-        return status;
-    }
-    const auto controller = session.Interface<ITavController2>("ITavController2");
-    if (!controller) {
-        return kExitFailed;
-    }
-    const tav::Bstr language = ToBstr(*text);
-    return session.Write("SetLanguage", [&](TavInParams* rip) { return controller->SetLanguage(rip, language.Get()); });
+int IdGet(Verb& v) {
+    v.End();
+    return v.Get("GetControllerID", &C::GetControllerID, &C::UnpackControllerID);
 }
-
-int Guid(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    if (!NoMore(session, args, "guid", status)) {
-        return status;
-    }
-    ITavController* controller = session.Controller();
-    tav::Bstr guid;
-    return session.Read(
-        "GetSystemID", [&](TavInParams* rip) { return controller->GetSystemID(rip, guid.Receive()); },
-        [&](VARIANT* data) { return controller->UnpackSystemID(data, guid.Receive()); },
-        [&] { session.Print(ToUtf8(guid)); });
+int IdSet(Verb& v) {
+    const auto id = v.Text("ID");
+    v.End();
+    return v.Set("SetControllerId", &C::SetControllerId, id.Get());
 }
-
-int Environment(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    const auto name = Required(session, args, "env", "the variable's name", status);
-    if (!name || !NoMore(session, args, "env", status)) {
-        return status;
-    }
-    ITavController* controller = session.Controller();
-    const tav::Bstr variable = ToBstr(*name);
-    tav::Bstr value;
-    return session.Read(
-        "GetEnvironmentVariable",
-        [&](TavInParams* rip) { return controller->GetEnvironmentVariable(rip, variable.Get(), value.Receive()); },
-        [&](VARIANT* data) { return controller->UnpackEnvironmentVariable(data, value.Receive()); },
-        [&] { session.Print(ToUtf8(value)); });
+int LanguageSet(Verb& v) {
+    const auto language = v.Text("LANGUAGE");
+    v.End();
+    return v.Set("SetLanguage", &ITavController2::SetLanguage, language.Get());
 }
-
-int Option(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    const auto name = Required(session, args, "option", "the option's name", status);
-    if (!name || !NoMore(session, args, "option", status)) {
-        return status;
-    }
-    ITavController* controller = session.Controller();
-    const tav::Bstr option = ToBstr(*name);
-    LONG present = 0;
-    return session.Read(
-        "IsOptionPresent", [&](TavInParams* rip) { return controller->IsOptionPresent(rip, option.Get(), &present); },
-        [&](VARIANT* data) { return controller->UnpackIsOptionPresent(data, &present); },
-        [&] { session.Print(present != 0 ? "present" : "absent"); });
+int Guid(Verb& v) {
+    v.End();
+    return v.Get("GetSystemID", &C::GetSystemID, &C::UnpackSystemID);
 }
-
-int Clients(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    if (!NoMore(session, args, "clients", status)) {
-        return status;
-    }
-    const auto controller = session.Interface<ITavController4>("ITavController4");
-    if (!controller) {
-        return kExitFailed;
-    }
-    tav::Bstr xml;
-    return session.Read(
-        "GetConnectedTavAPIClients",
-        [&](TavInParams* rip) { return controller->GetConnectedTavAPIClients(rip, xml.Receive()); },
-        [&](VARIANT* data) { return controller->UnpackConnectedTavAPIClients(data, xml.Receive()); },
-        [&] { session.Print(ToUtf8(xml)); });
+int Environment(Verb& v) {
+    const auto name = v.Text("NAME");
+    v.End();
+    return v.Get("GetEnvironmentVariable", &C::GetEnvironmentVariable, &C::UnpackEnvironmentVariable, name.Get());
 }
-
-int Energy(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    if (!NoMore(session, args, "energy", status)) {
-        return status;
-    }
-    const auto controller = session.Interface<ITavController4>("ITavController4");
-    if (!controller) {
-        return kExitFailed;
-    }
-    TavSysEnergyState state = TavSysEnergyStateNotPaused;
-    return session.Read(
-        "GetSysEnergyState", [&](TavInParams* rip) { return controller->GetSysEnergyState(rip, &state); },
-        [&](VARIANT* data) { return controller->UnpackSysEnergyState(data, &state); },
-        [&] { session.Print(NameOf(EnergyStateNames(), state)); });
+int Option(Verb& v) {
+    const auto name = v.Text("OPTION");
+    v.End();
+    return v.GetShown(AsBoolean, "IsOptionPresent", &C::IsOptionPresent, &C::UnpackIsOptionPresent, name.Get());
 }
-
-int Link(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    if (!NoMore(session, args, "link", status)) {
-        return status;
-    }
-    ITavController* controller = session.Controller();
-    status = session.Write("CheckFileTransferLink",
-                           [&](TavInParams* rip) { return controller->CheckFileTransferLink(rip); });
-    if (status == kExitOk) {
-        session.Print("link OK");
+int Clients(Verb& v) {
+    v.End();
+    return v.Get("GetConnectedTavAPIClients", &ITavController4::GetConnectedTavAPIClients,
+                 &ITavController4::UnpackConnectedTavAPIClients);
+}
+int Energy(Verb& v) {
+    v.End();
+    return v.Get("GetSysEnergyState", &ITavController4::GetSysEnergyState, &ITavController4::UnpackSysEnergyState);
+}
+int Link(Verb& v) {
+    v.End();
+    const int status = v.Set("CheckFileTransferLink", &C::CheckFileTransferLink);
+    if (status == kExitOk && !v.session.Options().json) {
+        v.session.Print("link OK");
     }
     return status;
 }
 
-int Version(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    const std::string what = args.Done() ? "system" : *args.Next();
-    if (what == "system" || what == "release") {
-        const TavControllerInfo type = what == "system" ? SystemInfo : ReleaseInfo;
-        const auto systemName = args.Next();
-        if (!NoMore(session, args, "version", status)) {
-            return status;
-        }
-        ITavController* controller = session.Controller();
-        tav::Bstr info;
-        if (!systemName) {
-            return session.Read(
-                "GetVersionInfo", [&](TavInParams* rip) { return controller->GetVersionInfo(rip, type, info.Receive()); },
-                [&](VARIANT* data) { return controller->UnpackVersionInfo(data, info.Receive()); },
-                [&] { session.Print(ToUtf8(info)); });
-        }
-        const tav::Bstr system = ToBstr(*systemName);
-        return session.Read(
-            "GetVersionInfoFromSystem",
-            [&](TavInParams* rip) { return controller->GetVersionInfoFromSystem(rip, system.Get(), type, info.Receive()); },
-            [&](VARIANT* data) { return controller->UnpackVersionInfo(data, info.Receive()); },
-            [&] { session.Print(ToUtf8(info)); });
+int VersionInfo(Verb& v, TavControllerInfo type) {
+    const auto system = v.OptionalWord();
+    v.End();
+    if (!system) {
+        return v.Get("GetVersionInfo", &C::GetVersionInfo, &C::UnpackVersionInfo, type);
     }
-    if (what == "name") {
-        if (!NoMore(session, args, "version", status)) {
-            return status;
-        }
-        const auto controller = session.Interface<ITavController5>("ITavController5");
-        if (!controller) {
-            return kExitFailed;
-        }
-        tav::Bstr name;
-        return session.Read(
-            "GetVersionName", [&](TavInParams* rip) { return controller->GetVersionName(rip, name.Receive()); },
-            [&](VARIANT* data) { return controller->UnpackVersionName(data, name.Receive()); },
-            [&] { session.Print(ToUtf8(name)); });
-    }
-    if (what == "product") {
-        const auto product = Required(session, args, "version", "the product's name", status);
-        if (!product || !NoMore(session, args, "version", status)) {
-            return status;
-        }
-        const auto controller = session.Interface<ITavController6>("ITavController6");
-        if (!controller) {
-            return kExitFailed;
-        }
-        const tav::Bstr productName = ToBstr(*product);
-        tav::Bstr name;
-        return session.Read(
-            "GetProductVersionName",
-            [&](TavInParams* rip) { return controller->GetProductVersionName(rip, productName.Get(), name.Receive()); },
-            [&](VARIANT* data) { return controller->UnpackProductVersionName(data, name.Receive()); },
-            [&] { session.Print(ToUtf8(name)); });
-    }
-    return session.Usage("version", "expected system, release, name or product, not " + what);
+    const auto name = Verb::ToBstr(*system);
+    return v.Get("GetVersionInfoFromSystem", &C::GetVersionInfoFromSystem, &C::UnpackVersionInfo, name.Get(), type);
+}
+int VersionSystem(Verb& v) { return VersionInfo(v, SystemInfo); }
+int VersionRelease(Verb& v) { return VersionInfo(v, ReleaseInfo); }
+int VersionName(Verb& v) {
+    v.End();
+    return v.Get("GetVersionName", &ITavController5::GetVersionName, &ITavController5::UnpackVersionName);
+}
+int VersionProduct(Verb& v) {
+    const auto product = v.Text("PRODUCT");
+    v.End();
+    return v.Get("GetProductVersionName", &ITavController6::GetProductVersionName,
+                 &ITavController6::UnpackProductVersionName, product.Get());
 }
 
-int LastError(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    if (!NoMore(session, args, "error", status)) {
-        return status;
-    }
-    const auto helper = session.Interface<ITavHelperBase>("ITavHelperBase");
-    if (!helper) {
-        return kExitFailed;
-    }
+int LastError(Verb& v) {
+    v.End();
+    const auto helper = v.Interface<ITavHelperBase>();
     tav::Bstr text;
     const HRESULT hr = helper->GetLastErrorInfo(text.Receive());
     if (FAILED(hr)) {
-        return session.Fail("GetLastErrorInfo", hr);
+        return v.session.Fail("GetLastErrorInfo", hr);
     }
-    session.Print(text.IsNull() ? "(no error recorded)" : ToUtf8(text));
+    if (!v.session.Options().json && text.IsNull()) {
+        v.session.Print("(no error recorded)");
+    } else {
+        v.session.Show(TextValue(text.Get()));
+    }
     return kExitOk;
 }
 
-constexpr CommandSpec kCommands[] = {
-    {"name", "read or set the controller's name",
-     "Usage: tavctl name get\n"
-     "       tavctl name set NAME\n"
-     "GetControllerName / SetControllerName.\n",
-     Name},
-    {"id", "read or set the controller identifier",
-     "Usage: tavctl id get\n"
-     "       tavctl id set ID\n"
-     "GetControllerID / SetControllerId.\n",
-     Id},
-    {"language", "set the controller's language",
-     "Usage: tavctl language set LANGUAGE\n"
-     "SetLanguage (ITavController2).\n",
-     Language},
-    {"guid", "print the system GUID",
-     "Usage: tavctl guid\n"
-     "GetSystemID.\n",
-     Guid},
-    {"env", "print an environment variable of the controller",
-     "Usage: tavctl env NAME\n"
-     "GetEnvironmentVariable.\n",
-     Environment},
-    {"option", "tell whether an option is installed",
-     "Usage: tavctl option NAME\n"
-     "IsOptionPresent; prints present or absent.\n",
-     Option},
-    {"clients", "list the connected API clients (XML)",
-     "Usage: tavctl clients\n"
-     "GetConnectedTavAPIClients (ITavController4).\n",
-     Clients},
-    {"energy", "print the system energy state",
-     "Usage: tavctl energy\n"
-     "GetSysEnergyState (ITavController4).\n",
-     Energy},
-    {"link", "check the file transfer link",
-     "Usage: tavctl link\n"
-     "CheckFileTransferLink.\n",
-     Link},
-    {"version", "print version information",
-     "Usage: tavctl version [system|release] [SYSTEM]\n"
-     "       tavctl version name\n"
-     "       tavctl version product PRODUCT\n"
-     "GetVersionInfo (or GetVersionInfoFromSystem with a system name),\n"
-     "GetVersionName (ITavController5), GetProductVersionName (ITavController6).\n",
-     Version},
-    {"error", "print the object's last-error text",
-     "Usage: tavctl error\n"
-     "GetLastErrorInfo; most useful in a batch, after a failing command.\n",
-     LastError},
+constexpr VerbSpec kName[] = {
+    {"get", "", "print the controller's name (GetControllerName)", NameGet},
+    {"set", "NAME", "set the controller's name (SetControllerName)", NameSet},
+};
+constexpr VerbSpec kId[] = {
+    {"get", "", "print the controller identifier (GetControllerID)", IdGet},
+    {"set", "ID", "set the controller identifier (SetControllerId)", IdSet},
+};
+constexpr VerbSpec kLanguage[] = {{"set", "LANGUAGE", "set the controller's language (SetLanguage)", LanguageSet}};
+constexpr VerbSpec kGuid[] = {{"", "", "print the system GUID (GetSystemID)", Guid}};
+constexpr VerbSpec kEnvironment[] = {{"", "NAME", "print a variable (GetEnvironmentVariable)", Environment}};
+constexpr VerbSpec kOption[] = {{"", "OPTION", "tell whether an option is installed (IsOptionPresent)", Option}};
+constexpr VerbSpec kClients[] = {{"", "", "list the connected API clients as XML (GetConnectedTavAPIClients)", Clients}};
+constexpr VerbSpec kEnergy[] = {{"", "", "print the system energy state (GetSysEnergyState)", Energy}};
+constexpr VerbSpec kLink[] = {{"", "", "check the file transfer link (CheckFileTransferLink)", Link}};
+constexpr VerbSpec kVersion[] = {
+    {"", "[SYSTEM]", "the same as version system", VersionSystem},
+    {"system", "[SYSTEM]", "print the system version (GetVersionInfo, GetVersionInfoFromSystem)", VersionSystem},
+    {"release", "[SYSTEM]", "print the release version (GetVersionInfo, GetVersionInfoFromSystem)",
+     VersionRelease},
+    {"name", "", "print the version name (GetVersionName)", VersionName},
+    {"product", "PRODUCT", "print a product's version name (GetProductVersionName)", VersionProduct},
+};
+constexpr VerbSpec kError[] = {{"", "",
+                                "print the object's last-error text (GetLastErrorInfo); most useful in a batch, "
+                                "after a failing command",
+                                LastError}};
+
+constexpr GroupSpec kGroups[] = {
+    {"name", "The controller's name", kName},
+    {"id", "The controller identifier", kId},
+    {"language", "The controller's language", kLanguage},
+    {"guid", "The system GUID", kGuid},
+    {"env", "Environment variables of the controller", kEnvironment},
+    {"option", "Installed options", kOption},
+    {"clients", "Connected API clients", kClients},
+    {"energy", "The system energy state", kEnergy},
+    {"link", "The file transfer link", kLink},
+    {"version", "Version information", kVersion},
+    {"error", "The object's last-error text", kError},
 };
 
 }  // namespace
 
-std::span<const CommandSpec> IdentityCommands() { return kCommands; }
+std::span<const GroupSpec> IdentityGroups() { return kGroups; }
 
 }  // namespace tavctl

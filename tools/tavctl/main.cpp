@@ -1,20 +1,22 @@
 // tavctl: one controller operation per command, from the command line or a
 // batch, through the TavController module.
-#include <algorithm>
 #include <fstream>
 #include <iostream>
 #include <optional>
 #include <string>
 #include <vector>
 
+#include "sim/trace.h"
 #include "sim/virtual_controller.h"
 #include "tav/bstr.h"
 #include "tav/com_ptr.h"
-#include "tavctl/command_support.h"
+#include "tav/com_scope.h"
+#include "tavctl/arguments.h"
 #include "tavctl/commands.h"
 #include "tavctl/module_loader.h"
 #include "tavctl/names.h"
 #include "tavctl/options.h"
+#include "tavctl/output.h"
 #include "tavctl/session.h"
 #include "tavctl/text.h"
 
@@ -24,30 +26,10 @@ namespace {
 constexpr const char* kBatchHelp =
     "Usage: tavctl [OPTIONS] batch [FILE]\n"
     "Runs the commands in FILE (standard input when FILE is - or missing), one\n"
-    "per line, against one controller object. Words are separated by blanks;\n"
-    "double quotes group words (\\\" is a quote), # starts a comment. Stops at\n"
-    "the first failing command unless --keep-going; --echo prints each command.\n";
-
-// COMMAND --help needs neither the module nor a controller.
-std::optional<int> HelpOnly(const std::vector<std::string>& words) {
-    const bool asked = std::find_if(words.begin(), words.end(), [](const std::string& w) {
-                           return w == "--help" || w == "-h";
-                       }) != words.end();
-    if (words.empty() || !asked) {
-        return std::nullopt;
-    }
-    if (words.front() == "batch") {
-        std::cout << kBatchHelp;
-        return kExitOk;
-    }
-    for (const CommandSpec& command : Commands()) {
-        if (words.front() == command.name) {
-            std::cout << command.help;
-            return kExitOk;
-        }
-    }
-    return std::nullopt;
-}
+    "per line, against the same controller objects. Words are separated by\n"
+    "blanks; double quotes group words (\\\" is a quote), # starts a comment. A\n"
+    "line may start with --client N (run on object N) and --json. Stops at the\n"
+    "first failing command unless --keep-going; --echo prints each command.\n";
 
 void ApplySimulatorFaults(const GlobalOptions& options) {
     const auto controller = tav::sim::ControllerAt(ToOle(options.url));
@@ -118,6 +100,24 @@ int RunBatch(Session& session, std::istream& input) {
     return result;
 }
 
+// Ends the wire trace before the session it prints through goes.
+struct TraceScope {
+    explicit TraceScope(Session* session) : active(session != nullptr) {
+        if (active) {
+            tav::sim::SetTraceSink(
+                [session](const tav::sim::TraceRecord& record) { session->Diagnostic("trace: " + tav::sim::TraceLine(record)); });
+        }
+    }
+    ~TraceScope() {
+        if (active) {
+            tav::sim::SetTraceSink({});
+        }
+    }
+    TraceScope(const TraceScope&) = delete;
+    TraceScope& operator=(const TraceScope&) = delete;
+    bool active;
+};
+
 int Run(const std::vector<std::string>& args) {
     std::size_t next = 0;
     bool helpWanted = false;
@@ -126,20 +126,30 @@ int Run(const std::vector<std::string>& args) {
         return kExitUsage;
     }
     const std::vector<std::string> words(args.begin() + static_cast<std::ptrdiff_t>(next), args.end());
-    if (auto status = HelpOnly(words)) {
-        return *status;
+    if (!words.empty() && words.front() == "batch" && (words.size() == 2 && (words[1] == "--help" || words[1] == "-h"))) {
+        std::cout << kBatchHelp;
+        return kExitOk;
     }
-    if (helpWanted) {
+    if (auto help = HelpFor(words)) {
+        std::cout << *help;
+        return kExitOk;
+    }
+    if (helpWanted || (!words.empty() && (words.front() == "help"))) {
         std::cout << GeneralHelp();
         return kExitOk;
     }
     if (words.empty()) {
-        std::cerr << "tavctl: no command given (tavctl --help lists them)\n";
+        std::cerr << "tavctl: no command given\n(tavctl --help lists the groups)\n";
+        return kExitUsage;
+    }
+    if (words.front() != "batch" && words.front() != "--client" && words.front() != "--json" &&
+        FindGroup(words.front()) == nullptr) {
+        std::cerr << "tavctl: unknown group " << Quote(words.front()) << "\n(tavctl --help lists the groups)\n";
         return kExitUsage;
     }
     const CLSID* clsid = ClassByName(options->className);
     if (clsid == nullptr) {
-        std::cerr << "tavctl: unknown class " << options->className
+        std::cerr << "tavctl: unknown class " << Quote(options->className)
                   << " (TavController, TavController2 ... TavController17)\n";
         return kExitUsage;
     }
@@ -158,31 +168,49 @@ int Run(const std::vector<std::string>& args) {
     if (!module) {
         return kExitSetup;
     }
-    tav::ComPtr<ITavController> controller;
-    HRESULT hr = module->CreateInstance(*clsid, IID_ITavController, reinterpret_cast<void**>(&controller));
-    if (FAILED(hr)) {
-        std::cerr << "tavctl: cannot create " << options->className << " from " << module->Path().string() << ": "
-                  << DescribeHresult(hr) << "\n";
-        return kExitSetup;
-    }
-    Session session(*options, controller);
-    const tav::Bstr url = ToBstr(options->url);
-    hr = controller->Init(url.Get());
-    if (FAILED(hr)) {
-        session.Fail("Init(" + options->url + ")", hr);
+    const std::string className = options->className;
+    const std::string url = options->url;
+    auto factory = [&](tav::ComPtr<ITavController>& client, std::string& error) {
+        HRESULT hr = module->CreateInstance(*clsid, IID_ITavController, reinterpret_cast<void**>(&client));
+        if (FAILED(hr)) {
+            error = "cannot create " + className + " from " + module->Path().string() + ": " + DescribeHresult(hr);
+            return hr;
+        }
+        const tav::Bstr text(tav::OleStringView(ToOle(url)));
+        hr = client->Init(text.Get());
+        if (FAILED(hr)) {
+            tav::ComPtr<ITavHelperBase> helper;
+            tav::Bstr lastError;
+            if (SUCCEEDED(client->QueryInterface(IID_ITavHelperBase, reinterpret_cast<void**>(&helper)))) {
+                helper->GetLastErrorInfo(lastError.Receive());
+            }
+            error = "Init(" + Quote(url) + ") failed: " + DescribeHresult(hr) +
+                    "; last error: " + (lastError.IsNull() ? std::string("(none)") : ToUtf8(lastError.View()));
+            client = nullptr;
+        }
+        return hr;
+    };
+    const unsigned firstClient = options->client;
+    Session session(*options, factory);
+    session.SelectClient(firstClient);
+    TraceScope trace(options->trace ? &session : nullptr);
+    // The object is made and bound before the first command, so that a bad
+    // URL is a setup failure rather than the command's.
+    if (session.Controller() == nullptr) {
         return kExitSetup;
     }
 
     if (words.front() == "batch") {
         if (words.size() > 2) {
-            return session.Usage("batch", "expected at most one file");
+            session.Error("batch: expected at most one file, not " + Quote(words[2]) + "\nUsage: tavctl batch [FILE]");
+            return kExitUsage;
         }
         if (words.size() == 1 || words[1] == "-") {
             return RunBatch(session, std::cin);
         }
         std::ifstream file(words[1]);
         if (!file) {
-            session.Error("cannot read " + words[1]);
+            session.Error("batch: cannot read " + Quote(words[1]));
             return kExitUsage;
         }
         return RunBatch(session, file);
@@ -194,15 +222,12 @@ int Run(const std::vector<std::string>& args) {
 }  // namespace tavctl
 
 int main(int argc, char** argv) {
-    const bool comInitialised = SUCCEEDED(CoInitializeEx(nullptr, COINIT_MULTITHREADED));
+    const tav::ComScope com;
     int status = tavctl::kExitFailed;
     try {
         status = tavctl::Run(std::vector<std::string>(argv + 1, argv + argc));
     } catch (const std::exception& error) {
         std::cerr << "tavctl: " << error.what() << "\n";
-    }
-    if (comInitialised) {
-        CoUninitialize();
     }
     return status;
 }

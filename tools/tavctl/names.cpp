@@ -8,53 +8,6 @@
 namespace tavctl {
 namespace {
 
-constexpr EnumName kControllerStates[] = {
-    {InitState, "InitState"}, {MotorsOff, "MotorsOff"},         {MotorsOn, "MotorsOn"},     {GuardStop, "GuardStop"},
-    {EmergencyStop, "EmergencyStop"}, {EmergencyStopReset, "EmergencyStopReset"}, {SysFail, "SysFail"},
-};
-
-constexpr EnumName kOperationModes[] = {
-    {Auto, "Auto"},           {InitOp, "InitOp"},         {Manr, "Manr"},
-    {Manf, "Manf"},           {AutoChange, "AutoChange"}, {ManfChange, "ManfChange"},
-    {UndefinedMode, "UndefinedMode"},
-};
-
-constexpr EnumName kCollisionStates[] = {
-    {CollisionDetect_Init, "CollisionDetect_Init"},
-    {CollisionDetect_Triggered, "CollisionDetect_Triggered"},
-    {CollisionDetect_Confirmed, "CollisionDetect_Confirmed"},
-    {CollisionDetect_TriggeredAck, "CollisionDetect_TriggeredAck"},
-};
-
-constexpr EnumName kEnergyStates[] = {
-    {TavSysEnergyStateNotPaused, "TavSysEnergyStateNotPaused"},
-    {TavSysEnergyStatePaused, "TavSysEnergyStatePaused"},
-    {TavSysEnergyStateBlocked, "TavSysEnergyStateBlocked"},
-    {TavSysEnergyStateResuming, "TavSysEnergyStateResuming"},
-    {TavSysEnergyStatePausing, "TavSysEnergyStatePausing"},
-};
-
-constexpr EnumName kRestartModes[] = {
-    {WarmStart, "WarmStart"}, {ColdStart, "ColdStart"}, {PStart, "PStart"}, {IStart, "IStart"},
-    {XStart, "XStart"},       {SStart, "SStart"},       {BStart, "BStart"},
-};
-
-constexpr EnumName kAutoConditions[] = {
-    {AutoConditionType_BlockedSignals, "AutoConditionType_BlockedSignals"},
-    {AutoConditionType_DeactivatedTasks, "AutoConditionType_DeactivatedTasks"},
-    {AutoConditionType_CallChain, "AutoConditionType_CallChain"},
-    {AutoConditionType_SpeedOverride, "AutoConditionType_SpeedOverride"},
-    {AutoConditionType_RunMode, "AutoConditionType_RunMode"},
-    {AutoConditionType_StartExecute, "AutoConditionType_StartExecute"},
-    {AutoConditionType_KestoSpy, "AutoConditionType_KestoSpy"},
-    {AutoConditionType_Eio, "AutoConditionType_Eio"},
-};
-
-constexpr EnumName kConfigurations[] = {
-    {TavAutoConditionConfiguration_Reset, "TavAutoConditionConfiguration_Reset"},
-    {TavAutoConditionConfiguration_Keep, "TavAutoConditionConfiguration_Keep"},
-};
-
 struct HresultEntry {
     HRESULT hr;
     const char* name;
@@ -81,14 +34,6 @@ constexpr HresultEntry kHresults[] = {
 
 }  // namespace
 
-std::span<const EnumName> ControllerStateNames() { return kControllerStates; }
-std::span<const EnumName> OperationModeNames() { return kOperationModes; }
-std::span<const EnumName> CollisionStateNames() { return kCollisionStates; }
-std::span<const EnumName> EnergyStateNames() { return kEnergyStates; }
-std::span<const EnumName> RestartModeNames() { return kRestartModes; }
-std::span<const EnumName> AutoConditionNames() { return kAutoConditions; }
-std::span<const EnumName> ConfigurationNames() { return kConfigurations; }
-
 std::string NameOf(std::span<const EnumName> names, long value) {
     for (const EnumName& entry : names) {
         if (entry.value == value) {
@@ -106,6 +51,17 @@ std::optional<long> ValueOf(std::span<const EnumName> names, std::string_view na
         }
     }
     return std::nullopt;
+}
+
+std::string NameList(std::span<const EnumName> names) {
+    std::string list;
+    for (std::size_t i = 0; i < names.size(); ++i) {
+        if (i != 0) {
+            list += i + 1 == names.size() ? " or " : ", ";
+        }
+        list += names[i].name;
+    }
+    return list;
 }
 
 std::string HresultName(HRESULT hr) {

@@ -14,19 +14,34 @@ struct EnumName {
     const char* name;
 };
 
-std::span<const EnumName> ControllerStateNames();
-std::span<const EnumName> OperationModeNames();
-std::span<const EnumName> CollisionStateNames();
-std::span<const EnumName> EnergyStateNames();
-std::span<const EnumName> RestartModeNames();
-std::span<const EnumName> AutoConditionNames();
-std::span<const EnumName> ConfigurationNames();
+// The names of every value of enum E, taken from the IDL at build time.
+template <typename E>
+std::span<const EnumName> NamesOf();
+
+struct EnumType {
+    const char* name;
+    std::span<const EnumName> (*names)();
+};
+
+// The name of interface I as the type library has it.
+template <typename I>
+inline constexpr const char* kInterfaceName = "the interface";
+
+#include "enum_names.inc"
 
 // The name of value, or the number in decimal when it has none.
 std::string NameOf(std::span<const EnumName> names, long value);
 
+template <typename E>
+std::string NameOf(E value) {
+    return NameOf(NamesOf<E>(), static_cast<long>(value));
+}
+
 // The value of a name, compared without regard to case.
 std::optional<long> ValueOf(std::span<const EnumName> names, std::string_view name);
+
+// "A, B or C": the names of a table, for usage messages.
+std::string NameList(std::span<const EnumName> names);
 
 // "E_INVALIDARG" and friends, the virtual controller's statuses, or "".
 std::string HresultName(HRESULT hr);

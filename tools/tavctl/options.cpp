@@ -1,5 +1,6 @@
 #include "tavctl/options.h"
 
+#include <cerrno>
 #include <cstdlib>
 #include <iostream>
 #include <sstream>
@@ -9,16 +10,18 @@
 namespace tavctl {
 namespace {
 
+// A 32-bit unsigned number, decimal or 0x-hexadecimal, and nothing else.
 std::optional<unsigned long> Number(const std::string& text) {
-    if (text.empty()) {
+    if (text.empty() || text[0] == '-' || text[0] == '+' || text[0] == ' ') {
         return std::nullopt;
     }
+    errno = 0;
     char* end = nullptr;
-    const unsigned long value = std::strtoul(text.c_str(), &end, 0);
-    if (*end != '\0') {
+    const unsigned long long value = std::strtoull(text.c_str(), &end, 0);
+    if (*end != '\0' || errno == ERANGE || value > 0xFFFFFFFFull) {
         return std::nullopt;
     }
-    return value;
+    return static_cast<unsigned long>(value);
 }
 
 bool Usage(const std::string& message) {
@@ -27,6 +30,17 @@ bool Usage(const std::string& message) {
 }
 
 }  // namespace
+
+std::optional<unsigned> ClientNumber(const std::string& text) {
+    if (text.empty() || text.find_first_not_of("0123456789") != std::string::npos || text.size() > 3) {
+        return std::nullopt;
+    }
+    const unsigned long number = std::strtoul(text.c_str(), nullptr, 10);
+    if (number < 1 || number > kMaxClients) {
+        return std::nullopt;
+    }
+    return static_cast<unsigned>(number);
+}
 
 std::optional<GlobalOptions> ParseGlobalOptions(const std::vector<std::string>& args, std::size_t& next,
                                                 bool& helpWanted) {
@@ -73,6 +87,19 @@ std::optional<GlobalOptions> ParseGlobalOptions(const std::vector<std::string>& 
                 return std::nullopt;
             }
             options.timeoutMs = static_cast<ULONG>(*ms);
+        } else if (arg == "--json") {
+            options.json = true;
+        } else if (arg == "--trace") {
+            options.trace = true;
+        } else if (arg == "--client") {
+            const auto text = value(arg);
+            if (!text) return std::nullopt;
+            const auto number = ClientNumber(*text);
+            if (!number) {
+                Usage("--client wants a number from 1 to " + std::to_string(kMaxClients) + ", not " + *text);
+                return std::nullopt;
+            }
+            options.client = *number;
         } else if (arg == "--echo") {
             options.echo = true;
         } else if (arg == "--keep-going") {
@@ -123,11 +150,11 @@ std::optional<GlobalOptions> ParseGlobalOptions(const std::vector<std::string>& 
 
 std::string GeneralHelp() {
     std::ostringstream help;
-    help << "Usage: tavctl [OPTIONS] COMMAND [ARGS...]\n"
+    help << "Usage: tavctl [OPTIONS] GROUP VERB [ARGS...]\n"
             "       tavctl [OPTIONS] batch [FILE]\n"
             "\n"
             "Talks to a robot controller through the TavController module: loads the\n"
-            "module, creates one controller object, calls Init with the URL and runs one\n"
+            "module, creates a controller object, calls Init with the URL and runs one\n"
             "operation per command. Without --url it talks to the embedded virtual\n"
             "controller at /sim.\n"
             "\n"
@@ -141,26 +168,34 @@ std::string GeneralHelp() {
             "  --async              call asynchronously and print the reply that arrives\n"
             "                       at the callback, decoded\n"
             "  --timeout MS         time-out handed to the command component (default 5000)\n"
+            "  --json               print values as JSON (also after any command)\n"
+            "  --trace              print every command the embedded virtual controller\n"
+            "                       receives, with its reply and the time it took (other\n"
+            "                       programs: TAV_SIM_TRACE=stderr or =FILE)\n"
+            "  --client N           run the command on controller object N (1 to 16, each\n"
+            "                       made and initialised on first use; in a batch a line\n"
+            "                       may start with --client N)\n"
             "  --echo               batch: print each command before running it\n"
             "  --keep-going         batch: go on after a failing command\n"
             "  --sim-delay CMD=MS   virtual controller: answer controller command CMD\n"
             "                       (e.g. SystemClock) after MS milliseconds\n"
             "  --sim-fail CMD[=HR]  virtual controller: answer CMD with failure status HR\n"
             "  --sim-link-down      virtual controller: the transport fails\n"
-            "  -h, --help           this text; COMMAND --help describes a command\n"
+            "  -h, --help           this text; GROUP --help and GROUP VERB --help describe\n"
+            "                       a group and a verb\n"
             "\n"
-            "Commands:\n";
-    for (const CommandSpec& command : Commands()) {
-        help << "  " << command.name;
-        const std::size_t width = std::string(command.name).size();
-        help << std::string(width < 11 ? 11 - width : 1, ' ') << command.summary << "\n";
+            "Groups:\n";
+    for (const GroupSpec& group : Groups()) {
+        const std::string name = group.name;
+        help << "  " << name << std::string(name.size() < 12 ? 12 - name.size() : 1, ' ') << group.summary << "\n";
     }
-    help << "  batch      run commands from FILE (or standard input), one per line\n"
+    help << "  batch       run commands from FILE (or standard input), one per line\n"
             "\n"
             "Enums print and parse by their type-library names (MotorsOn, AutoChange, ...),\n"
-            "times as ISO-8601 UTC (2026-11-21T02:30:00Z). On failure tavctl prints the\n"
-            "HRESULT and the module's last-error text and exits with 1 (2: usage error,\n"
-            "3: the module, class or Init failed).\n";
+            "times as ISO-8601 UTC (2026-11-21T02:30:00Z). Exit status: 0 done; 1 an\n"
+            "operation failed (tavctl prints the HRESULT, its name and the module's\n"
+            "last-error text); 2 the command line is wrong; 3 the module, class or Init\n"
+            "failed.\n";
     return help.str();
 }
 

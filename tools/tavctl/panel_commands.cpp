@@ -1,92 +1,38 @@
 // The operating panel: motors state, operation mode with its auto
-// conditions, collision detection and acknowledgements.
-#include <cstdlib>
-#include <vector>
+// conditions, collision detection, acknowledgements, the speed ratio and the
+// operator-mode PIN lock.
+#include <algorithm>
 
-#include "tavctl/command_support.h"
-#include "tavctl/commands.h"
-#include "tavctl/names.h"
+#include "tavctl/verb.h"
 
 namespace tavctl {
 namespace {
 
-// A known name, or else a number passed on as it is for the module to judge.
-std::optional<long> EnumArgument(std::span<const EnumName> names, std::span<const EnumName> aliases,
-                                 const std::string& word) {
-    if (auto value = ValueOf(names, word)) {
-        return value;
-    }
-    if (auto value = ValueOf(aliases, word)) {
-        return value;
-    }
-    char* end = nullptr;
-    const long number = std::strtol(word.c_str(), &end, 10);
-    if (end == word.c_str() || *end != '\0') {
-        return std::nullopt;
-    }
-    return number;
+constexpr EnumName kStateWords[] = {{MotorsOn, "on"}, {MotorsOff, "off"}};
+constexpr EnumName kAcknowledgements[] = {{AutoAck, "auto"}, {ManfAck, "manf"}, {ColDetAck, "coldet"}};
+constexpr EnumName kConditionAnswers[] = {{AutoConditionAck_Reset, "reset"}, {AutoConditionAck_Keep, "keep"}};
+
+int StateGet(Verb& v) {
+    v.End();
+    return v.Get("GetControllerState", &ITavPanel::GetControllerState, &ITavPanel::UnpackControllerState);
 }
 
-const EnumName kStateAliases[] = {{MotorsOn, "on"}, {MotorsOff, "off"}};
-const EnumName kAcknowledgements[] = {{AutoAck, "auto"}, {ManfAck, "manf"}, {ColDetAck, "coldet"},
-                                      {AutoAck, "AutoAck"}, {ManfAck, "ManfAck"}, {ColDetAck, "ColDetAck"}};
-const EnumName kConditionAnswers[] = {{AutoConditionAck_Reset, "reset"}, {AutoConditionAck_Keep, "keep"},
-                                      {AutoConditionAck_Reset, "AutoConditionAck_Reset"},
-                                      {AutoConditionAck_Keep, "AutoConditionAck_Keep"}};
-
-int State(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    const bool keyless = args.Flag("--keyless");
-    const auto verb = Required(session, args, "state", "get or set", status);
-    if (!verb) {
-        return status;
-    }
-    if (*verb == "get") {
-        if (!NoMore(session, args, "state", status)) {
-            return status;
-        }
-        const auto panel = session.Interface<ITavPanel>("ITavPanel");
-        if (!panel) {
-            return kExitFailed;
-        }
-        TavControllerState state = InitState;
-        return session.Read(
-            "GetControllerState", [&](TavInParams* rip) { return panel->GetControllerState(rip, &state); },
-            [&](VARIANT* data) { return panel->UnpackControllerState(data, &state); },
-            [&] { session.Print(NameOf(ControllerStateNames(), state)); });
-    }
-    if (*verb != "set") {
-        return session.Usage("state", "expected get or set, not " + *verb);
-    }
-    const auto word = Required(session, args, "state", "the state", status);
-    if (!word || !NoMore(session, args, "state", status)) {
-        return status;
-    }
-    const auto value = EnumArgument(ControllerStateNames(), kStateAliases, *word);
-    if (!value) {
-        return session.Usage("state", "unknown state " + *word);
-    }
-    const auto state = static_cast<TavControllerState>(*value);
+int StateSet(Verb& v) {
+    const bool keyless = v.Flag("--keyless");
+    const std::string word = v.Word("STATE");
+    v.End();
+    const auto state = static_cast<TavControllerState>(v.EnumValue("STATE", word, NamesOf<TavControllerState>(),
+                                                                   kStateWords));
     if (keyless) {
-        const auto panel3 = session.Interface<ITavPanel3>("ITavPanel3");
-        if (!panel3) {
-            return kExitFailed;
-        }
-        return session.Write("SetControllerStateKeyLess",
-                             [&](TavInParams* rip) { return panel3->SetControllerStateKeyLess(rip, state); });
+        return v.Set("SetControllerStateKeyLess", &ITavPanel3::SetControllerStateKeyLess, state);
     }
-    const auto panel = session.Interface<ITavPanel>("ITavPanel");
-    if (!panel) {
-        return kExitFailed;
-    }
-    return session.Write("SetControllerState", [&](TavInParams* rip) { return panel->SetControllerState(rip, state); });
+    return v.Set("SetControllerState", &ITavPanel::SetControllerState, state);
 }
 
-// Prints the pending conditions of an AUTO_CH reply. The version-2 decoder
-// knows every condition type; only the version-1 decoder hands out the IDs
-// that an acknowledgement needs, so both read the same reply, element by
-// element.
-void PrintConditions(Session& session, ITavPanel* panel, IEnumAutoCondition2* conditions, VARIANT* reply) {
+// The pending conditions of an AUTO_CH reply. The version-2 decoder knows
+// every condition type; only the version-1 decoder hands out the IDs that an
+// acknowledgement needs, so both read the same reply, element by element.
+std::vector<Record> Conditions(Session& session, ITavPanel* panel, IEnumAutoCondition2* conditions, VARIANT* reply) {
     std::vector<TavAutoCondition2> typed;
     TavAutoCondition2 element{};
     ULONG fetched = 0;
@@ -104,30 +50,25 @@ void PrintConditions(Session& session, ITavPanel* panel, IEnumAutoCondition2* co
     while (identified && identified->RemNext(1, &withId, &fetched) == S_OK && fetched == 1) {
         withIds.push_back(withId);
     }
-    const std::size_t count = std::max(typed.size(), withIds.size());
-    for (std::size_t i = 0; i < count; ++i) {
-        std::string line = "  ";
-        line += i < withIds.size() ? "ID " + std::to_string(withIds[i].ConditionID) : std::string("ID ?");
-        line += "  ";
-        line += i < typed.size() ? NameOf(AutoConditionNames(), typed[i].Condition)
-                                 : NameOf(AutoConditionNames(), withIds[i].Condition);
-        if (i < withIds.size()) {
-            line += withIds[i].KeepIsAllowed != 0 ? "  (Keep allowed)" : "  (Reset only)";
-        }
-        session.Print(line);
+    std::vector<Record> rows;
+    for (std::size_t i = 0; i < std::max(typed.size(), withIds.size()); ++i) {
+        const long condition = i < typed.size() ? typed[i].Condition : withIds[i].Condition;
+        rows.push_back({{"id", i < withIds.size() ? Value::Unsigned(withIds[i].ConditionID) : Value::Null()},
+                        {"condition", Value::Text(NameOf(NamesOf<TavAutoConditionType>(), condition))},
+                        {"keep", i < withIds.size() ? Value::Boolean(withIds[i].KeepIsAllowed != 0) : Value::Null()}});
     }
+    return rows;
 }
 
-int ModeGet(Session& session) {
-    const auto panel2 = session.Interface<ITavPanel2>("ITavPanel2");
-    if (!panel2) {
-        return kExitFailed;
-    }
+int ModeGet(Verb& v) {
+    v.End();
+    Session& session = v.session;
+    const auto panel2 = v.Interface<ITavPanel2>();
     TavOperationMode mode = UndefinedMode;
     int status = kExitOk;
     auto reply = session.CallThroughCallback(
-        "GetOperationMode2",
-        [&](TavInParams* rip) { return panel2->GetOperationMode2(rip, &mode, nullptr, nullptr); }, status);
+        "GetOperationMode2", [&](TavInParams* rip) { return panel2->GetOperationMode2(rip, &mode, nullptr, nullptr); },
+        status);
     if (!reply) {
         return status;
     }
@@ -137,152 +78,138 @@ int ModeGet(Session& session) {
     if (FAILED(hr)) {
         return session.Fail("UnpackOperationMode2", hr);
     }
-    session.Print(NameOf(OperationModeNames(), mode));
-    if (mode != AutoChange) {
+    std::vector<Record> rows;
+    if (mode == AutoChange) {
+        hr = panel2->UnpackOperationMode2(reply->data.Get(), &mode, &conditions, &cycle);
+        if (FAILED(hr)) {
+            return session.Fail("UnpackOperationMode2 (the condition list)", hr);
+        }
+        rows = Conditions(session, panel2.Get(), conditions.Get(), reply->data.Get());
+    }
+    if (session.Options().json) {
+        std::string conditionsJson = Json(rows);
+        Record record{{"mode", Show(mode)}, {"cycle", Value::Unsigned(cycle)}};
+        std::string json = Json(record);
+        json.pop_back();
+        session.Print(json + ", \"conditions\": " + conditionsJson + "}");
         return kExitOk;
     }
-    hr = panel2->UnpackOperationMode2(reply->data.Get(), &mode, &conditions, &cycle);
-    if (FAILED(hr)) {
-        return session.Fail("UnpackOperationMode2 (the condition list)", hr);
+    session.Print(NameOf(mode));
+    for (const Record& row : rows) {
+        session.Print("  ID " + PlainText(row[0].second) + "  " + row[1].second.text +
+                      (row[2].second.text == "true" ? "  (Keep allowed)" : "  (Reset only)"));
     }
-    PrintConditions(session, panel2.Get(), conditions.Get(), reply->data.Get());
     if (cycle != 0) {
         session.Print("  cycle " + std::to_string(cycle));
     }
     return kExitOk;
 }
 
-int Mode(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    const auto verb = Required(session, args, "mode", "get or set", status);
-    if (!verb) {
-        return status;
-    }
-    if (*verb == "get") {
-        return NoMore(session, args, "mode", status) ? ModeGet(session) : status;
-    }
-    if (*verb != "set") {
-        return session.Usage("mode", "expected get or set, not " + *verb);
-    }
-    const auto word = Required(session, args, "mode", "the mode", status);
-    if (!word || !NoMore(session, args, "mode", status)) {
-        return status;
-    }
-    const auto value = EnumArgument(OperationModeNames(), std::span<const EnumName>(), *word);
-    if (!value) {
-        return session.Usage("mode", "unknown mode " + *word);
-    }
-    const auto panel3 = session.Interface<ITavPanel3>("ITavPanel3");
-    if (!panel3) {
-        return kExitFailed;
-    }
-    return session.Write("SetOPMode", [&](TavInParams* rip) {
-        return panel3->SetOPMode(rip, static_cast<TavOperationMode>(*value));
-    });
+int ModeSet(Verb& v) {
+    const auto mode = v.Enum<TavOperationMode>("MODE");
+    v.End();
+    return v.Set("SetOPMode", &ITavPanel3::SetOPMode, mode);
 }
 
-int Collision(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    const auto rest = args.Rest();
-    if (!rest.empty() && rest != std::vector<std::string>{"get"} && rest != std::vector<std::string>{"state"}) {
-        return session.Usage("collision", "expected no argument, get or state");
-    }
-    const auto panel = session.Interface<ITavPanel>("ITavPanel");
-    if (!panel) {
-        return kExitFailed;
-    }
-    TavCollisionDetectState state = CollisionDetect_Init;
-    status = session.Read(
-        "GetCollisionDetectState", [&](TavInParams* rip) { return panel->GetCollisionDetectState(rip, &state); },
-        [&](VARIANT* data) { return panel->UnpackCollisionDetectState(data, &state); },
-        [&] { session.Print(NameOf(CollisionStateNames(), state)); });
-    return status;
+int Collision(Verb& v) {
+    v.End();
+    return v.Get("GetCollisionDetectState", &ITavPanel::GetCollisionDetectState,
+                 &ITavPanel::UnpackCollisionDetectState);
 }
 
-int Acknowledge(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    const auto word = Required(session, args, "ack", "auto, manf or coldet", status);
-    if (!word || !NoMore(session, args, "ack", status)) {
-        return status;
-    }
-    const auto value = EnumArgument(kAcknowledgements, std::span<const EnumName>(), *word);
-    if (!value) {
-        return session.Usage("ack", "expected auto, manf or coldet, not " + *word);
-    }
-    const auto panel = session.Interface<ITavPanel>("ITavPanel");
-    if (!panel) {
-        return kExitFailed;
-    }
-    return session.Write("Acknowledge", [&](TavInParams* rip) {
-        return panel->Acknowledge(rip, static_cast<TavAcknowledge>(*value));
-    });
+int Acknowledge(Verb& v) {
+    const auto what = v.Enum<TavAcknowledge>("WHAT", kAcknowledgements);
+    v.End();
+    return v.Set("Acknowledge", &ITavPanel::Acknowledge, what);
 }
 
-int AutoCondition(Session& session, CommandArguments& args) {
-    int status = kExitOk;
-    const auto verb = Required(session, args, "autocond", "ack", status);
-    if (!verb) {
-        return status;
-    }
-    if (*verb != "ack") {
-        return session.Usage("autocond", "expected ack, not " + *verb);
-    }
-    const auto idText = Required(session, args, "autocond", "the condition ID", status);
-    const auto answerText = idText ? Required(session, args, "autocond", "reset or keep", status) : std::nullopt;
-    if (!answerText || !NoMore(session, args, "autocond", status)) {
-        return status;
-    }
-    char* end = nullptr;
-    const unsigned long id = std::strtoul(idText->c_str(), &end, 10);
-    if (end == idText->c_str() || *end != '\0') {
-        return session.Usage("autocond", "the condition ID is a number, not " + *idText);
-    }
-    const auto answer = EnumArgument(kConditionAnswers, std::span<const EnumName>(), *answerText);
-    if (!answer) {
-        return session.Usage("autocond", "expected reset or keep, not " + *answerText);
-    }
-    const auto panel = session.Interface<ITavPanel>("ITavPanel");
-    if (!panel) {
-        return kExitFailed;
-    }
-    return session.Write("AcknowledgeAutoCondition", [&](TavInParams* rip) {
-        return panel->AcknowledgeAutoCondition(rip, static_cast<TavAutoConditionAck>(*answer), static_cast<ULONG>(id));
-    });
+int AutoConditionAck(Verb& v) {
+    const auto id = v.Number<ULONG>("ID");
+    const auto answer = v.Enum<TavAutoConditionAck>("ANSWER", kConditionAnswers);
+    v.End();
+    return v.Set("AcknowledgeAutoCondition", &ITavPanel::AcknowledgeAutoCondition, answer, id);
 }
 
-constexpr CommandSpec kCommands[] = {
-    {"state", "read or set the controller (motors) state",
-     "Usage: tavctl state get\n"
-     "       tavctl state set STATE [--keyless]\n"
-     "GetControllerState / SetControllerState (SetControllerStateKeyLess of\n"
-     "ITavPanel3 with --keyless). STATE: MotorsOn (on), MotorsOff (off), or any\n"
-     "other TavControllerState name or number, for the module to refuse.\n",
-     State},
-    {"mode", "read or set the operation mode",
-     "Usage: tavctl mode get\n"
-     "       tavctl mode set MODE\n"
-     "get: GetOperationMode2 (ITavPanel2). The reply is taken through the callback\n"
-     "so that, in AutoChange, the pending auto conditions can be listed with the\n"
-     "IDs that autocond ack needs (UnpackOperationMode2 and UnpackAutoConditions).\n"
-     "set: SetOPMode (ITavPanel3). MODE: Auto, Manr, Manf (or another\n"
-     "TavOperationMode name or number, for the module to refuse).\n",
-     Mode},
-    {"collision", "print the collision detection state",
-     "Usage: tavctl collision [get|state]\n"
-     "GetCollisionDetectState.\n",
-     Collision},
-    {"ack", "acknowledge a mode change or a collision",
-     "Usage: tavctl ack auto|manf|coldet\n"
-     "Acknowledge with AutoAck, ManfAck or ColDetAck.\n",
-     Acknowledge},
-    {"autocond", "answer a pending auto condition",
-     "Usage: tavctl autocond ack ID reset|keep\n"
-     "AcknowledgeAutoCondition; mode get lists the IDs.\n",
-     AutoCondition},
+int SpeedGet(Verb& v) {
+    v.End();
+    return v.Get("GetSpeedRatio", &ITavPanel::GetSpeedRatio, &ITavPanel::UnpackSpeedRatio);
+}
+
+int SpeedSet(Verb& v) {
+    const auto ratio = v.Number<short>("RATIO");
+    v.End();
+    return v.Set("SetSpeedRatio", &ITavPanel::SetSpeedRatio, ratio);
+}
+
+int PinLock(Verb& v) {
+    const bool permanent = v.Flag("--permanent");
+    const auto pin = v.Number<ULONG>("PIN");
+    v.End();
+    if (permanent) {
+        return v.Set("LockOPModePinCode2", &ITavPanel4::LockOPModePinCode2, pin, LONG{1});
+    }
+    return v.Set("LockOPModePinCode", &ITavPanel3::LockOPModePinCode, pin);
+}
+
+int PinUnlock(Verb& v) {
+    const auto pin = v.Number<ULONG>("PIN");
+    v.End();
+    return v.Set("UnlockOPModePinCode", &ITavPanel3::UnlockOPModePinCode, pin);
+}
+
+int PinState(Verb& v) {
+    v.End();
+    return v.Get("GetOPModePinCodeLockState", &ITavPanel3::GetOPModePinCodeLockState,
+                 &ITavPanel3::UnpackOPModePinCodeLockState);
+}
+
+constexpr VerbSpec kState[] = {
+    {"get", "", "print the controller (motors) state (GetControllerState)", StateGet},
+    {"set", "STATE [--keyless]", "set the controller state (SetControllerState)", StateSet,
+     "STATE: MotorsOn (on), MotorsOff (off), or any other TavControllerState name\n"
+     "or number, for the module to refuse. --keyless: SetControllerStateKeyLess.\n"},
+};
+constexpr VerbSpec kMode[] = {
+    {"get", "", "print the operation mode and pending auto conditions (GetOperationMode2)", ModeGet,
+     "The reply is taken through the callback so that, in AutoChange, the pending\n"
+     "auto conditions are listed with the IDs that autocond ack needs.\n"},
+    {"set", "MODE", "set the operation mode (SetOPMode)", ModeSet,
+     "MODE: Auto, Manr, Manf (or another TavOperationMode name or number, for the\n"
+     "module to refuse).\n"},
+};
+constexpr VerbSpec kCollision[] = {
+    {"", "", "print the collision detection state (GetCollisionDetectState)", Collision},
+    {"get", "", "the same", Collision},
+    {"state", "", "the same", Collision},
+};
+constexpr VerbSpec kAck[] = {
+    {"", "auto|manf|coldet", "acknowledge a mode change or a collision (Acknowledge)", Acknowledge}};
+constexpr VerbSpec kAutoCondition[] = {
+    {"ack", "ID reset|keep", "answer a pending auto condition (AcknowledgeAutoCondition)", AutoConditionAck,
+     "mode get lists the IDs.\n"}};
+constexpr VerbSpec kSpeed[] = {
+    {"get", "", "print the speed ratio in percent (GetSpeedRatio)", SpeedGet},
+    {"set", "RATIO", "set the speed ratio in percent (SetSpeedRatio)", SpeedSet},
+};
+constexpr VerbSpec kPin[] = {
+    {"lock", "PIN [--permanent]", "lock the operation mode with a PIN (LockOPModePinCode)", PinLock,
+     "--permanent: LockOPModePinCode2 with the permanent flag (ITavPanel4).\n"},
+    {"unlock", "PIN", "unlock the operation mode (UnlockOPModePinCode)", PinUnlock},
+    {"state", "", "print the PIN lock state (GetOPModePinCodeLockState)", PinState},
+};
+
+constexpr GroupSpec kGroups[] = {
+    {"state", "The controller (motors) state", kState},
+    {"mode", "The operation mode", kMode},
+    {"collision", "Collision detection", kCollision},
+    {"ack", "Acknowledgements", kAck},
+    {"autocond", "Auto conditions", kAutoCondition},
+    {"speed", "The speed ratio", kSpeed},
+    {"pin", "The operator-mode PIN lock", kPin},
 };
 
 }  // namespace
 
-std::span<const CommandSpec> PanelCommands() { return kCommands; }
+std::span<const GroupSpec> PanelGroups() { return kGroups; }
 
 }  // namespace tavctl

@@ -1,16 +1,36 @@
 #include "tavctl/session.h"
 
+#include <cstdlib>
 #include <iostream>
 
-#include "tavctl/names.h"
 #include "tavctl/text.h"
 
 namespace tavctl {
 
-Session::Session(GlobalOptions options, tav::ComPtr<ITavController> controller)
-    : options_(std::move(options)), controller_(std::move(controller)) {}
+Session::Session(GlobalOptions options, ClientFactory factory)
+    : options_(std::move(options)), factory_(std::move(factory)) {}
 
 Session::~Session() { StopWatch(); }
+
+ITavController* Session::Controller() {
+    auto found = clients_.find(current_);
+    if (found != clients_.end()) {
+        return found->second.Get();
+    }
+    tav::ComPtr<ITavController> client;
+    std::string error;
+    if (FAILED(factory_(client, error)) || !client) {
+        Error("client " + std::to_string(current_) + ": " + error);
+        return nullptr;
+    }
+    return clients_.emplace(current_, std::move(client)).first->second.Get();
+}
+
+unsigned Session::ClassVersion() const {
+    const std::string& name = options_.className;
+    const std::size_t digits = name.find_first_of("0123456789");
+    return digits == std::string::npos ? 1u : static_cast<unsigned>(std::strtoul(name.c_str() + digits, nullptr, 10));
+}
 
 void Session::Print(const std::string& line) {
     std::lock_guard lock(outputMutex_);
@@ -23,6 +43,16 @@ void Session::Error(const std::string& line) {
     std::cerr << "tavctl: " << line << std::endl;
 }
 
+void Session::Diagnostic(const std::string& line) {
+    std::lock_guard lock(outputMutex_);
+    std::cout.flush();
+    std::cerr << line << std::endl;
+}
+
+void Session::Show(const Value& value) { Print(options_.json ? Json(value) : PlainText(value)); }
+void Session::Show(const Record& record) { Print(options_.json ? Json(record) : PlainText(record)); }
+void Session::Show(const std::vector<Record>& table) { Print(options_.json ? Json(table) : PlainText(table)); }
+
 TavInParams Session::SyncParams() const {
     TavInParams rip{};
     rip.callType = Sync;
@@ -33,15 +63,16 @@ TavInParams Session::SyncParams() const {
 int Session::Fail(const std::string& operation, HRESULT hr) {
     std::string text = "(none)";
     tav::ComPtr<ITavHelperBase> helper;
-    if (SUCCEEDED(controller_->QueryInterface(IID_ITavHelperBase, reinterpret_cast<void**>(&helper)))) {
+    ITavController* controller = Controller();
+    if (controller != nullptr &&
+        SUCCEEDED(controller->QueryInterface(IID_ITavHelperBase, reinterpret_cast<void**>(&helper)))) {
         BSTR lastError = nullptr;
         if (SUCCEEDED(helper->GetLastErrorInfo(&lastError)) && lastError != nullptr) {
             text = ToUtf8(lastError);
         }
         SysFreeString(lastError);
     }
-    Error(operation + " failed: " + DescribeHresult(hr));
-    Error("last error: " + text);
+    Error(operation + " failed: " + DescribeHresult(hr) + "; last error: " + text);
     return kExitFailed;
 }
 
@@ -49,18 +80,14 @@ int Session::Fail(const std::string& operation, HRESULT hr) {
 // last error the way an asynchronous client hands it over.
 int Session::FailReply(const std::string& operation, CallbackReply& reply) {
     tav::ComPtr<ITavHelperBase> helper;
-    if (reply.data.Type() == VT_BSTR &&
-        SUCCEEDED(controller_->QueryInterface(IID_ITavHelperBase, reinterpret_cast<void**>(&helper)))) {
+    ITavController* controller = Controller();
+    if (controller != nullptr && reply.data.Type() == VT_BSTR &&
+        SUCCEEDED(controller->QueryInterface(IID_ITavHelperBase, reinterpret_cast<void**>(&helper)))) {
         helper->SetLastErrorInfo(reply.data.Get());
     }
-    Error(operation + " failed: the reply's status is " + DescribeHresult(reply.status));
-    Error("reply: " + (reply.data.Type() == VT_BSTR ? ToUtf8(reply.data.StringView()) : std::string("(no text)")));
+    Error(operation + " failed: the reply's status is " + DescribeHresult(reply.status) + "; reply: " +
+          (reply.data.Type() == VT_BSTR ? ToUtf8(reply.data.StringView()) : std::string("(no text)")));
     return kExitFailed;
-}
-
-int Session::Usage(const std::string& command, const std::string& message) {
-    Error(command + ": " + message + "\n(tavctl " + command + " --help shows the usage)");
-    return kExitUsage;
 }
 
 std::optional<CallbackReply> Session::CallThroughCallback(const std::string& operation, const Call& call,
@@ -112,6 +139,11 @@ int Session::Read(const std::string& operation, const Call& call, const Unpack& 
     auto reply = CallThroughCallback(operation, call, exitStatus);
     if (!reply) {
         return exitStatus;
+    }
+    if (!unpack) {
+        Show(Record{{"reply", reply->data.Type() == VT_BSTR ? Value::Text(ToUtf8(reply->data.StringView()))
+                                                             : Value::Null()}});
+        return kExitOk;
     }
     const HRESULT hr = unpack(reply->data.Get());
     if (FAILED(hr)) {
