@@ -35,12 +35,22 @@ OleStringView Reply::Text() const {
 
 std::size_t Reply::Find(OleStringView key) const {
     const OleStringView text = Text();
-    const std::size_t at = text.find(key);
-    // Only the text before a match needs to be searched for a NUL.
-    if (at == OleStringView::npos || text.substr(0, at).find(OLECHAR(0)) != OleStringView::npos) {
-        return OleStringView::npos;
+    if (key.empty()) {
+        return 0;
     }
-    return at;
+    // One pass that stops at the first NUL: a reply searched for many keys
+    // is read once per key, not twice (the key, then the text before it).
+    const OLECHAR first = key.front();
+    for (std::size_t at = 0; at < text.size(); ++at) {
+        const OLECHAR c = text[at];
+        if (c == first && text.substr(at, key.size()) == key) {
+            return at;
+        }
+        if (c == OLECHAR(0)) {
+            break;
+        }
+    }
+    return OleStringView::npos;
 }
 
 HRESULT Reply::Fail(HRESULT hr, OleStringView text, Where where) { return Fail(hr, text, ErrorSite::From(where)); }
