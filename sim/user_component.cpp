@@ -167,7 +167,48 @@ std::optional<Arguments> RepliedPairs(const VARIANT* data) {
     return Arguments::Parse(FromBstr(data->bstrVal));
 }
 
+// The two numbers and the login of a reply or event text, as the three
+// decoders read them: out-values cleared first, handed out only when all of
+// it is read.
+struct LoginText {
+    std::int32_t number = 0;  // the privilege, state or status
+    std::uint32_t id = 0;     // the user id or the client
+};
+
+HRESULT ReadLoginText(VARIANT* data, TextView numberKey, TextView idKey, LoginText& read, TavLoginInfo* login) {
+    ClearLogin(login);
+    const auto pairs = RepliedPairs(data);
+    const auto number = pairs ? pairs->Signed(numberKey) : std::nullopt;
+    const auto id = pairs ? pairs->Unsigned(idKey) : std::nullopt;
+    if (!number || !id) {
+        return E_FAIL;
+    }
+    if (FAILED(FillLogin(*pairs, login))) {
+        return E_OUTOFMEMORY;
+    }
+    read = LoginText{number.value_or(0), id.value_or(0)};
+    return S_OK;
+}
+
+// A Sync reply handed to the component's own decoder, as a client hands an
+// event's data.
+template <typename Unpack>
+HRESULT DecodeReply(const Text& reply, Unpack&& unpack) {
+    const Bstr text{OleStringView(reply)};
+    VARIANT data;
+    data.vt = VT_BSTR;
+    data.bstrVal = text.Get();
+    return unpack(&data);
+}
+
 }  // namespace
+
+HRESULT UserComponent::Decoded(HRESULT hr, TextView operation, TextView what) {
+    if (hr == E_FAIL) {
+        return Fail(E_FAIL, Concat({kComponent, operation, OLESTR(": not "), what}));
+    }
+    return FAILED(hr) ? Fail(hr, Concat({kComponent, operation, OLESTR(": out of memory")})) : S_OK;
+}
 
 HRESULT UserComponent::LogonUser(TavInParams* rip) {
     return Guarded([&] { return Send(rip, OLESTR("LogonUser"), OLESTR("Set"), OLESTR("UserLogon"), OLESTR("-Local 0")); });
@@ -208,25 +249,19 @@ HRESULT UserComponent::CancelManualModePrivileges(TavInParams* rip) {
 HRESULT UserComponent::UnpackManualModePrivRequestEvent(VARIANT* data, TavLoginInfo* user, ULONG* userId,
                                                         TavManualModePrivileges* priv) {
     return Guarded([&] {
-        const Text operation = OLESTR("UnpackManualModePrivRequestEvent");
+        const TextView operation = OLESTR("UnpackManualModePrivRequestEvent");
         if (userId == nullptr || priv == nullptr || user == nullptr) {
             return Fail(E_POINTER, Concat({kComponent, operation, OLESTR(": invalid out-pointer")}));
         }
-        ClearLogin(user);
         *userId = 0;
         *priv = TavManualModePrivileges_None;
-        const auto pairs = RepliedPairs(data);
-        const auto id = pairs ? pairs->Unsigned(OLESTR("-UserId")) : std::nullopt;
-        const auto asked = pairs ? pairs->Signed(OLESTR("-Priv")) : std::nullopt;
-        if (!id || !asked) {
-            return Fail(E_FAIL, Concat({kComponent, operation, OLESTR(": not a privilege request")}));
+        LoginText read;
+        const HRESULT hr = ReadLoginText(data, OLESTR("-Priv"), OLESTR("-UserId"), read, user);
+        if (SUCCEEDED(hr)) {
+            *userId = read.id;
+            *priv = static_cast<TavManualModePrivileges>(read.number);
         }
-        if (FAILED(FillLogin(*pairs, user))) {
-            return Fail(E_OUTOFMEMORY, Concat({kComponent, operation, OLESTR(": out of memory")}));
-        }
-        *userId = *id;
-        *priv = static_cast<TavManualModePrivileges>(*asked);
-        return S_OK;
+        return Decoded(hr, operation, OLESTR("a privilege request"));
     });
 }
 
@@ -247,11 +282,9 @@ HRESULT UserComponent::GetManualModePrivilegesState(TavInParams* rip, TavManualM
         if (FAILED(hr) || !answered) {
             return hr;
         }
-        const Bstr text{OleStringView(reply)};
-        VARIANT data;
-        data.vt = VT_BSTR;
-        data.bstrVal = text.Get();
-        return UnpackManualModePrivilegesState(&data, Me(), state, user, thisIsMe);
+        return DecodeReply(reply, [&](VARIANT* data) {
+            return UnpackManualModePrivilegesState(data, Me(), state, user, thisIsMe);
+        });
     });
 }
 
@@ -259,25 +292,19 @@ HRESULT UserComponent::UnpackManualModePrivilegesState(VARIANT* data, ULONG clie
                                                        TavManualModePrivilegesState* state, TavLoginInfo* user,
                                                        LONG* thisIsMe) {
     return Guarded([&] {
-        const Text operation = OLESTR("UnpackManualModePrivilegesState");
+        const TextView operation = OLESTR("UnpackManualModePrivilegesState");
         if (state == nullptr || user == nullptr || thisIsMe == nullptr) {
             return Fail(E_POINTER, Concat({kComponent, operation, OLESTR(": invalid out-pointer")}));
         }
-        ClearLogin(user);
         *state = TavManualModePrivilegesState_None;
         *thisIsMe = 0;
-        const auto pairs = RepliedPairs(data);
-        const auto value = pairs ? pairs->Signed(OLESTR("-State")) : std::nullopt;
-        const auto cid = pairs ? pairs->Unsigned(OLESTR("-Cid")) : std::nullopt;
-        if (!value || !cid) {
-            return Fail(E_FAIL, Concat({kComponent, operation, OLESTR(": not a privilege state")}));
+        LoginText read;
+        const HRESULT hr = ReadLoginText(data, OLESTR("-State"), OLESTR("-Cid"), read, user);
+        if (SUCCEEDED(hr)) {
+            *state = static_cast<TavManualModePrivilegesState>(read.number);
+            *thisIsMe = read.id != 0 && read.id == clientId ? 1 : 0;
         }
-        if (FAILED(FillLogin(*pairs, user))) {
-            return Fail(E_OUTOFMEMORY, Concat({kComponent, operation, OLESTR(": out of memory")}));
-        }
-        *state = static_cast<TavManualModePrivilegesState>(*value);
-        *thisIsMe = cid.value_or(0) != 0 && cid.value_or(0) == clientId ? 1 : 0;
-        return S_OK;
+        return Decoded(hr, operation, OLESTR("a privilege state"));
     });
 }
 
@@ -312,11 +339,9 @@ HRESULT UserComponent::GetPendingManualModePrivRequest(TavInParams* rip, TavLogi
         if (FAILED(hr) || !answered) {
             return hr;
         }
-        const Bstr text{OleStringView(reply)};
-        VARIANT data;
-        data.vt = VT_BSTR;
-        data.bstrVal = text.Get();
-        return UnpackPendingManualModePrivRequest(&data, user, userId, priv);
+        return DecodeReply(reply, [&](VARIANT* data) {
+            return UnpackPendingManualModePrivRequest(data, user, userId, priv);
+        });
     });
 }
 
@@ -407,36 +432,28 @@ HRESULT UserComponent::GetCurrentMaster(TavInParams* rip, TavMastershipResource 
         if (FAILED(hr) || !answered) {
             return hr;
         }
-        const Bstr text{OleStringView(reply)};
-        VARIANT data;
-        data.vt = VT_BSTR;
-        data.bstrVal = text.Get();
-        return UnpackCurrentMaster(&data, Me(), status, loginInfo, thisIsMe);
+        return DecodeReply(reply, [&](VARIANT* data) {
+            return UnpackCurrentMaster(data, Me(), status, loginInfo, thisIsMe);
+        });
     });
 }
 
 HRESULT UserComponent::UnpackCurrentMaster(VARIANT* data, ULONG cid, TavMastershipStatus* status,
                                            TavLoginInfo* loginInfo, LONG* thisIsMe) {
     return Guarded([&] {
-        const Text operation = OLESTR("UnpackCurrentMaster");
+        const TextView operation = OLESTR("UnpackCurrentMaster");
         if (status == nullptr || loginInfo == nullptr || thisIsMe == nullptr) {
             return Fail(E_POINTER, Concat({kComponent, operation, OLESTR(": invalid out-pointer")}));
         }
-        ClearLogin(loginInfo);
         *status = TavMastershipStatus_None;
         *thisIsMe = 0;
-        const auto pairs = RepliedPairs(data);
-        const auto value = pairs ? pairs->Signed(OLESTR("-Status")) : std::nullopt;
-        const auto holder = pairs ? pairs->Unsigned(OLESTR("-Cid")) : std::nullopt;
-        if (!value || !holder) {
-            return Fail(E_FAIL, Concat({kComponent, operation, OLESTR(": not a master text")}));
+        LoginText read;
+        const HRESULT hr = ReadLoginText(data, OLESTR("-Status"), OLESTR("-Cid"), read, loginInfo);
+        if (SUCCEEDED(hr)) {
+            *status = static_cast<TavMastershipStatus>(read.number);
+            *thisIsMe = read.id != 0 && read.id == cid ? 1 : 0;
         }
-        if (FAILED(FillLogin(*pairs, loginInfo))) {
-            return Fail(E_OUTOFMEMORY, Concat({kComponent, operation, OLESTR(": out of memory")}));
-        }
-        *status = static_cast<TavMastershipStatus>(*value);
-        *thisIsMe = holder.value_or(0) != 0 && holder.value_or(0) == cid ? 1 : 0;
-        return S_OK;
+        return Decoded(hr, operation, OLESTR("a master text"));
     });
 }
 

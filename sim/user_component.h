@@ -75,6 +75,8 @@ private:
     // caller's callback and `sent` stays false.
     HRESULT Send(TavInParams* rip, TextView operation, TextView verb, TextView command, TextView args,
                  Text* reply = nullptr, bool* answered = nullptr);
+    // A decoder's result with its text: E_FAIL for a text that is not `what`.
+    HRESULT Decoded(HRESULT hr, TextView operation, TextView what);
     // The client this component acts as: its own, or the one it impersonates.
     ULONG Me() const;
 
