@@ -23,7 +23,7 @@ std::vector<Session> Sessions() {
         {"watch", "", "watch start --type state\nstate set MotorsOn\nwatch wait --count 1\nwatch stop\n",
          {"state MotorsOn\n"}},
         {"watch json", "--json", "watch start --type state,mode\nstate set MotorsOn\nwatch wait --count 1\nwatch stop\n",
-         {"{\"type\": \"state\", \"state\": \"MotorsOn\"}\n"}},
+         {"\"type\": \"state\", \"state\": \"MotorsOn\"}\n"}},
         {"ipc", "",
          "ipc connect Inbox --max-msg 5 --max-size 100\nipc send Echo 7 hello --from 2 --user-data 42\n"
          "ipc receive 2 --timeout 2000\nipc slots\nipc name 1\nipc id Echo\n",

@@ -3,6 +3,7 @@
 #include <chrono>
 #include <sstream>
 
+#include "tavctl/iso_time.h"
 #include "tavctl/login_info.h"
 #include "tavctl/verb.h"
 
@@ -209,13 +210,13 @@ int Start(Verb& v, const std::optional<std::string>& list) {
     WatchState& watch = session.Watch();
     watch.subscribe = subscribe;
     watch.printer.Attach(EventPrinter::New(
-        [object, &session](ULONG type, VARIANT* data) {
-            const Record record = Decode(object.Get(), type, data);
+        [object, &session](ULONG type, VARIANT* data, const FILETIME& time) {
+            Record record = Decode(object.Get(), type, data);
             if (session.Options().json) {
-                std::string json = Json(record);
-                return "{\"type\": \"" + TypeName(type) + "\", " + json.substr(1);
+                record.insert(record.begin(), {{"time", TimeValue(time)}, {"type", Value::Text(TypeName(type))}});
+                return Json(record);
             }
-            std::string line = TypeName(type);
+            std::string line = FormatIsoUtc(time) + " " + TypeName(type);
             if (record.size() == 1 && record.front().first != "undecoded") {
                 return line + " " + PlainText(record.front().second);
             }

@@ -1,6 +1,5 @@
 #include "tavctl/event_printer.h"
 
-#include "tavctl/iso_time.h"
 
 namespace tavctl {
 
@@ -36,7 +35,7 @@ HRESULT EventPrinter::OnChange(TavEventData* data) {
         return E_POINTER;
     }
     try {
-        printer_(FormatIsoUtc(data->time) + " " + decoder_(data->userDef, &data->Data));
+        printer_(decoder_(data->userDef, &data->Data, data->time));
         {
             std::lock_guard lock(mutex_);
             ++count_;

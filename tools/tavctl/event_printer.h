@@ -14,9 +14,9 @@ namespace tavctl {
 // the command component's thread) and counts them.
 class EventPrinter final : public _ITavObjectEvents {
 public:
-    // Turns an event's data into the text after the time stamp; userDef tells
-    // which subscription it came from.
-    using Decoder = std::function<std::string(ULONG userDef, VARIANT* data)>;
+    // Turns an event into the line printed; userDef tells which subscription
+    // it came from.
+    using Decoder = std::function<std::string(ULONG userDef, VARIANT* data, const FILETIME& time)>;
     using Printer = std::function<void(const std::string& line)>;
 
     // A new printer holding one reference, the caller's.
