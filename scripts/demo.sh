@@ -1,7 +1,9 @@
 #!/usr/bin/env bash
 # A short tavctl session against the embedded virtual controller: identity,
 # the name, the clock, the motors state and the operation mode with its auto
-# conditions, events as they arrive, one asynchronous call and one failure.
+# conditions, events as they arrive, two clients contending for mastership,
+# messages through the echo slot, the wire trace, one asynchronous call and
+# one failure.
 # Usage: scripts/demo.sh BUILD_FOLDER
 set -euo pipefail
 build="${1:?usage: demo.sh BUILD_FOLDER}"
@@ -48,6 +50,21 @@ watch wait --count 6 --timeout 5
 mode get
 watch stop
 COMMANDS
+
+section "Two clients contend for mastership (--client N in a batch), as JSON"
+"$tavctl" --echo --keep-going --json batch <<'COMMANDS' || true
+user logon
+--client 2 user logon
+master request cfg
+--client 2 master request cfg
+--client 2 master get cfg
+COMMANDS
+
+section "Messages through the echo slot: tavctl ipc ping --count 1000"
+"$tavctl" ipc ping --count 1000 || status=1
+
+section "What went over the wire: tavctl --trace name get"
+"$tavctl" --trace name get || status=1
 
 section "An asynchronous call: tavctl --async clock get"
 "$tavctl" --async clock get || status=1
