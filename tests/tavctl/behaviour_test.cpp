@@ -30,7 +30,7 @@ std::vector<std::string> Lines(const std::string& text) {
 TEST_F(BehaviourTest, AsyncRepliesDecodeToTheSyncValues) {
     const char* commands[] = {
         "name get", "id get", "guid", "version", "version release", "version name", "state get", "collision",
-        "energy", "option Welding", "clock startup",
+        "energy", "option Welding", "speed get", "vt state", "safety mode", "timezone get",
     };
     for (const char* command : commands) {
         const ToolRun sync = RunTool(std::string("--json ") + command);
