@@ -37,6 +37,7 @@ std::optional<Reply> RunCommand(ControllerModel& controller, const Command& comm
     std::optional<Reply> reply = Carry(controller, command, timeOut, wait);
     if (reply) {
         TraceRecord record;
+        record.client = command.caller.clientId;
         record.url = command.url;
         record.verb = command.verb;
         record.command = command.name;
