@@ -90,7 +90,7 @@ void Finish(ModelState& state, std::uint64_t ticket, bool apply) {
         return;
     }
     const Reply installed =
-        InstallSystem(state, {OLESTR("apply_update"), kInboxFolder, /*deployment=*/true, /*overwrite=*/true});
+        InstallSystem(state, {.command = OLESTR("apply_update"), .folder = kInboxFolder, .deployment = true, .overwrite = true});
     if (SUCCEEDED(installed.status)) {
         inbox.state = InboxState::Committed;
     } else {

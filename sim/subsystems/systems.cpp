@@ -202,7 +202,7 @@ Reply InstallNewSystem(ControllerModel& controller, const Command& command) {
     }
     const auto systemPath = arguments->Find(OLESTR("-system_path"));
     const auto packageRoot = arguments->Find(OLESTR("-dp_pkg_root"));
-    InstallRequest request{command.name};
+    InstallRequest request{.command = command.name};
     const bool firstForm = arguments->Has(OLESTR("-overwrite")) || arguments->Has(OLESTR("-nooverwrite"));
     request.overwrite = arguments->Has(OLESTR("-overwrite"));
     request.controllerName = arguments->Find(OLESTR("-ctrl_name")).value_or(TextView());

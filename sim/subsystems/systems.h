@@ -45,12 +45,12 @@ struct SystemPackage {
 std::optional<SystemPackage> ReadPackage(const FileSystem& files, TextView folder, bool deployment, Text& problem);
 
 struct InstallRequest {
-    TextView command;  // for the texts: "InstallNewSystem"
-    TextView folder;
+    TextView command{};  // for the texts: "InstallNewSystem"
+    TextView folder{};
     bool deployment = false;
     bool overwrite = false;
-    TextView controllerName;  // recorded in the new system when given
-    TextView controllerId;
+    TextView controllerName{};  // recorded in the new system when given
+    TextView controllerId{};
 };
 
 // Installs the system of a package folder: its folder made and its HOME and

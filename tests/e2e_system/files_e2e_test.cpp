@@ -19,7 +19,7 @@ protected:
         TavRetrievalParams retrieval{};
         retrieval.noOfElts = -2;
         ComPtr<IEnumStorageDevices2> devices;
-        EXPECT_EQ(As<ITavDynamicDevices2>()->GetStorageDevices2(nullptr, &retrieval, devices.Receive()), S_OK)
+        EXPECT_EQ(As<ITavDynamicDevices2>()->GetStorageDevices2(nullptr, &retrieval, &devices), S_OK)
             << LastError();
         std::vector<Device> all;
         TavStorageDevice2 device{};
@@ -35,7 +35,7 @@ protected:
         TavRetrievalParams retrieval{};
         retrieval.noOfElts = -2;
         ComPtr<IEnumStorageDevices> devices;
-        EXPECT_EQ(As<ITavDynamicDevices2>()->GetStorageDevices(nullptr, &retrieval, devices.Receive()), S_OK)
+        EXPECT_EQ(As<ITavDynamicDevices2>()->GetStorageDevices(nullptr, &retrieval, &devices), S_OK)
             << LastError();
         return static_cast<ULONG>(retrieval.noOfElts);
     }

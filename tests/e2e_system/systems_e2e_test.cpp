@@ -18,7 +18,7 @@ protected:
     std::vector<std::string> Systems() {
         TavRetrievalParams retrieval{};
         ComPtr<ITavEnumBSTR> names;
-        EXPECT_EQ(Boot()->GetSystemNameList(nullptr, &retrieval, names.Receive()), S_OK) << LastError();
+        EXPECT_EQ(Boot()->GetSystemNameList(nullptr, &retrieval, &names), S_OK) << LastError();
         std::vector<std::string> all;
         BSTR name = nullptr;
         ULONG fetched = 0;
