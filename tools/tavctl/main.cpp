@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "sim/subsystems/devices.h"
 #include "sim/trace.h"
 #include "sim/virtual_controller.h"
 #include "tav/bstr.h"
@@ -44,6 +45,11 @@ void ApplySimulatorFaults(const GlobalOptions& options) {
     }
     if (options.simLinkDown) {
         controller->Faults().FailTransport();
+    }
+    for (const auto& device : options.simPlugged) {
+        if (!tav::sim::PlugDevice(*controller, ToOle(device))) {
+            std::cerr << "tavctl: --sim-plug: cannot plug in \"" << device << "\" (1 to 30 characters, not plugged yet)\n";
+        }
     }
 }
 

@@ -130,6 +130,10 @@ std::optional<GlobalOptions> ParseGlobalOptions(const std::vector<std::string>& 
             options.simFailures.emplace_back(text->substr(0, equals), status);
         } else if (arg == "--sim-link-down") {
             options.simLinkDown = true;
+        } else if (arg == "--sim-plug") {
+            const auto name = value(arg);
+            if (!name) return std::nullopt;
+            options.simPlugged.push_back(*name);
         } else {
             Usage("unknown option " + arg);
             return std::nullopt;
@@ -140,7 +144,8 @@ std::optional<GlobalOptions> ParseGlobalOptions(const std::vector<std::string>& 
     if (options.url.empty()) {
         options.url = "/sim";
     }
-    const bool faults = !options.simDelays.empty() || !options.simFailures.empty() || options.simLinkDown;
+    const bool faults = !options.simDelays.empty() || !options.simFailures.empty() || options.simLinkDown ||
+                        !options.simPlugged.empty();
     if (faults && !options.embedded) {
         Usage("the --sim-... switches need the embedded virtual controller (no --url, or --sim)");
         return std::nullopt;
@@ -181,6 +186,8 @@ std::string GeneralHelp() {
             "                       (e.g. SystemClock) after MS milliseconds\n"
             "  --sim-fail CMD[=HR]  virtual controller: answer CMD with failure status HR\n"
             "  --sim-link-down      virtual controller: the transport fails\n"
+            "  --sim-plug DEVICE    virtual controller: plug in a removable storage\n"
+            "                       device (e.g. usb1) holding a boot image and packages\n"
             "  -h, --help           this text; GROUP --help and GROUP VERB --help describe\n"
             "                       a group and a verb\n"
             "\n"

@@ -27,6 +27,7 @@ struct GlobalOptions {
     std::vector<std::pair<std::string, std::chrono::milliseconds>> simDelays;
     std::vector<std::pair<std::string, HRESULT>> simFailures;
     bool simLinkDown = false;
+    std::vector<std::string> simPlugged;  // removable devices plugged in
 };
 
 // Exit statuses.
