@@ -7,6 +7,7 @@
 #include "module/class_table.h"
 #include "module/server_registration.h"
 #include "tav/guarded.h"
+#include "tav/registry_file.h"
 
 
 STDAPI DllGetClassObject(REFCLSID clsid, REFIID riid, LPVOID* object) {
@@ -23,10 +24,21 @@ STDAPI DllGetClassObject(REFCLSID clsid, REFIID riid, LPVOID* object) {
 
 STDAPI DllCanUnloadNow(void) { return tav::ModuleLock::Count() == 0 ? S_OK : S_FALSE; }
 
-STDAPI DllRegisterServer(void) {
-    return tav::Guarded([] { return tav::RegisterServer(tav::RequestedRegistrationScope()); });
+namespace {
+
+// The registration's many writes are saved together: a registry kept in a
+// file is then rewritten once, not once per value.
+template <typename Registration> HRESULT InOneBatch(Registration&& registration) {
+    return tav::Guarded([&] {
+        tav::RegistryBatch batch;
+        const HRESULT hr = registration(tav::RequestedRegistrationScope());
+        const LONG saved = batch.End();
+        return SUCCEEDED(hr) && saved != ERROR_SUCCESS ? HRESULT_FROM_WIN32(saved) : hr;
+    });
 }
 
-STDAPI DllUnregisterServer(void) {
-    return tav::Guarded([] { return tav::UnregisterServer(tav::RequestedRegistrationScope()); });
-}
+}  // namespace
+
+STDAPI DllRegisterServer(void) { return InOneBatch(tav::RegisterServer); }
+
+STDAPI DllUnregisterServer(void) { return InOneBatch(tav::UnregisterServer); }

@@ -209,6 +209,17 @@ extern "C" {
 
 void TavSetRegistryFile(const char* path) { RegistryStore::Instance().UseFile(path == nullptr ? "" : path); }
 
+void TavBeginRegistryBatch(void) {
+    Guarded([] {
+        RegistryStore::Instance().BeginBatch();
+        return ERROR_SUCCESS;
+    });
+}
+
+LONG TavEndRegistryBatch(void) {
+    return Guarded([] { return RegistryStore::Instance().EndBatch(); });
+}
+
 LSTATUS RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD, LPWSTR, DWORD, REGSAM samDesired,
                         const LPSECURITY_ATTRIBUTES, PHKEY phkResult, LPDWORD lpdwDisposition) {
     return Guarded([&] { return OpenOrCreate(hKey, lpSubKey, true, samDesired, phkResult, lpdwDisposition); });

@@ -73,8 +73,11 @@ bool RegistryStore::FileStamp::operator==(const FileStamp& other) const {
            changed.tv_sec == other.changed.tv_sec && changed.tv_nsec == other.changed.tv_nsec;
 }
 
-RegistryStore::FileLock::~FileLock() {
+RegistryStore::FileLock::~FileLock() { Release(); }
+
+void RegistryStore::FileLock::Release() {
     if (descriptor_ >= 0) close(descriptor_);  // also releases the flock
+    descriptor_ = -1;
 }
 
 bool RegistryStore::FileLock::Acquire(const std::string& lockPath) {
@@ -148,6 +151,25 @@ LSTATUS RegistryStore::RefreshForWrite(FileLock& fileLock) {
                     : FileStamp{};
     if (loaded_ && path == path_ && text == content_) return ERROR_SUCCESS;
     return LoadText(path, std::move(text));
+}
+
+void RegistryStore::BeginBatch() {
+    std::lock_guard lock(mutex_);
+    if (batchDepth_++ == 0) {
+        batchHeld_ = RefreshForWrite(batchLock_) == ERROR_SUCCESS;
+        if (!batchHeld_) batchLock_.Release();
+        unsaved_ = false;
+    }
+}
+
+LSTATUS RegistryStore::EndBatch() {
+    std::lock_guard lock(mutex_);
+    if (batchDepth_ == 0 || --batchDepth_ > 0) return ERROR_SUCCESS;
+    LSTATUS status = batchHeld_ && unsaved_ ? Save() : ERROR_SUCCESS;
+    batchHeld_ = false;
+    unsaved_ = false;
+    batchLock_.Release();
+    return status;
 }
 
 LSTATUS RegistryStore::Save() {

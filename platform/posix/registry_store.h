@@ -7,6 +7,10 @@
 // renamed over the registry file. So two processes never lose each other's
 // changes and a reader never sees half a file. Reads take no file lock; they
 // reload when the file looks different from the one last read or written.
+//
+// A batch holds the file lock from its start to its end: changes are made in
+// memory only, and the tree is saved once at the end. While it runs, the
+// tree in memory is the registry (no other process can change the file).
 #pragma once
 #include <sys/stat.h>
 
@@ -29,7 +33,7 @@ public:
     // file could not be read (ERROR_BADDB, ERROR_REGISTRY_IO_FAILED).
     template <typename Reader> LSTATUS Read(Reader&& read) {
         std::lock_guard lock(mutex_);
-        LSTATUS status = RefreshForRead();
+        LSTATUS status = batchHeld_ ? ERROR_SUCCESS : RefreshForRead();
         return status != ERROR_SUCCESS ? status : read(static_cast<const RegistryTree&>(tree_));
     }
 
@@ -39,14 +43,24 @@ public:
     template <typename Changer> LSTATUS Write(Changer&& change) {
         std::lock_guard lock(mutex_);
         FileLock fileLock;
-        LSTATUS status = RefreshForWrite(fileLock);
+        LSTATUS status = batchHeld_ ? ERROR_SUCCESS : RefreshForWrite(fileLock);
         if (status != ERROR_SUCCESS) return status;
         bool changed = false;
         status = change(tree_, changed);
         if (status != ERROR_SUCCESS || !changed) return status;
         tree_.EnsureStandardKeys();
+        if (batchHeld_) {
+            unsaved_ = true;
+            return ERROR_SUCCESS;
+        }
         return Save();
     }
+
+    // Batches nest; only the outermost one locks and saves. A batch whose
+    // start could not lock or read the file leaves every change to save
+    // itself, as outside a batch.
+    void BeginBatch();
+    LSTATUS EndBatch();
 
 private:
     struct FileStamp {
@@ -66,6 +80,7 @@ private:
         FileLock& operator=(const FileLock&) = delete;
         ~FileLock();
         bool Acquire(const std::string& lockPath);
+        void Release();
 
     private:
         int descriptor_ = -1;
@@ -87,6 +102,10 @@ private:
     std::string content_;     // the text tree_ was read from or written as
     FileStamp stamp_;
     RegistryTree tree_;
+    int batchDepth_ = 0;
+    bool batchHeld_ = false;  // the outermost batch holds batchLock_
+    bool unsaved_ = false;    // the batch changed the tree
+    FileLock batchLock_;
 };
 
 }  // namespace tav::posix

@@ -2,3 +2,5 @@
 #include "tav/registry_file.h"
 
 extern "C" void TavSetRegistryFile(const char*) {}
+extern "C" void TavBeginRegistryBatch(void) {}
+extern "C" LONG TavEndRegistryBatch(void) { return ERROR_SUCCESS; }

@@ -259,6 +259,31 @@ TEST_F(Registry, ClassesRootIsTheMachineClassesKey) {
     RegCloseKey(key);
 }
 
+// A batch keeps its changes in memory, where the process reads them, and
+// writes the file once at the end of the outermost batch, with every change.
+TEST_F(Registry, ABatchIsReadInMemoryAndSavedOnceAtItsEnd) {
+    HKEY key = Create(OLESTR("Batched"));
+    const std::string before = FileText(sandbox.File());
+    {
+        tav::RegistryBatch outer;
+        SetNumber(key, OLESTR("First"), 1);
+        {
+            tav::RegistryBatch inner;
+            SetString(key, OLESTR("Second"), OLESTR("two"));
+            EXPECT_EQ(inner.End(), ERROR_SUCCESS);
+        }
+        RegCloseKey(Create(OLESTR("Batched\\Child")));
+        EXPECT_EQ(QueryString(key, OLESTR("Second")), OLESTR("two"));
+        EXPECT_EQ(SubkeyNames(key), std::vector<OleString>{OLESTR("Child")});
+        EXPECT_EQ(FileText(sandbox.File()), before) << "nothing written before the outermost batch ends";
+        EXPECT_EQ(outer.End(), ERROR_SUCCESS);
+    }
+    const std::string after = FileText(sandbox.File());
+    EXPECT_NE(after.find("\"Second\"=\"two\""), std::string::npos);
+    EXPECT_NE(after.find("Batched\\Child]"), std::string::npos);
+    RegCloseKey(key);
+}
+
 // Two processes write at once: with the lock and the re-read before each
 // change, neither loses the other's keys.
 TEST_F(Registry, TwoProcessesWritingAtOnceLoseNothing) {
