@@ -3,6 +3,7 @@
 // On Windows the system registry is used and this call does nothing.
 #pragma once
 #include "tav/export.h"
+#include "tav/platform.h"
 
 extern "C" {
 // NULL goes back to the environment's choice. Keys already open keep their
