@@ -259,6 +259,8 @@ constexpr CommandRow kRows[] = {
 
 }  // namespace
 
+bool LanAdaptorUp(const ModelState& state) { return state.Part<LanAdaptorState>().method != IpMethod::None; }
+
 const Subsystem& NetworkSubsystem() {
     static constexpr Subsystem subsystem{kRows};
     return subsystem;

@@ -2,6 +2,7 @@
 #include <cstdint>
 #include <optional>
 
+#include "sim/model_state.h"
 #include "sim/text.h"
 
 // IPv4 settings as the controller judges them, for its own LAN adaptor and
@@ -23,5 +24,9 @@ Text Ipv4Text(std::uint32_t address);
 // address that is the subnet's own or its broadcast, a gateway outside the
 // subnet); nothing when they can.
 std::optional<Text> Ipv4Refusal(const Ipv4Settings& settings);
+
+// Whether the controller's LAN adaptor is on (its method is not NONE): what
+// it asks of other hosts goes nowhere while it is off.
+bool LanAdaptorUp(const ModelState& state);
 
 }  // namespace tav::sim
