@@ -512,7 +512,8 @@ Reply LoadFile(ControllerModel& controller, const Command& command) {
         auto read = ReadConfiguration(state.Part<FileSystem>(), file);
         if (auto* why = std::get_if<Text>(&read)) {
             const HRESULT status = *why == OLESTR("does not exist") ? kStatusNotFound : kStatusBadArgument;
-            return Refused(kCommand, status, Concat({OLESTR("the configuration file "), Quoted(file), OLESTR(" "), *why}));
+            return Refused(kCommand, status,
+                           Concat({OLESTR("the configuration file "), Quoted(file), OLESTR(" "), *why}));
         }
         safety.loaded = std::get<Configuration>(std::move(read));
         return Done();

@@ -175,7 +175,9 @@ TEST_F(SafetyE2eTest, DeliveredConfigurationIsValidatedAndUnlocked) {
 TEST_F(SafetyE2eTest, ValidationLockAndModeFollowTheirRules) {
     auto safety = Safety();
     auto mode = [&](TavVantorSafetyMode m) { return [=] { return safety->SetSafetyMode(nullptr, m); }; };
-    auto lock = [&](const char* by) { return [=, this] { return Named(&ITavSafety::SetSafetyConfigurationLocked, by); }; };
+    auto lock = [&](const char* by) {
+        return [=, this] { return Named(&ITavSafety::SetSafetyConfigurationLocked, by); };
+    };
     auto validate = [&](const char* by) {
         return [=, this] { return Named(&ITavSafety::SetSafetyConfigurationValidated, by); };
     };
@@ -272,7 +274,9 @@ TEST_F(SafetyE2eTest, ALoadedFileComesIntoForceByAReconfigure) {
     EXPECT_EQ(v.toolPositionActive.Read(), "00000000");
 
     // A file of the client's own is copied to the controller first.
-    const std::filesystem::path local = std::filesystem::temp_directory_path() / ("netsafety_" + std::to_string(std::chrono::steady_clock::now().time_since_epoch().count()) + ".cfg");
+    const auto stamp = std::chrono::steady_clock::now().time_since_epoch().count();
+    const std::filesystem::path local =
+        std::filesystem::temp_directory_path() / ("netsafety_" + std::to_string(stamp) + ".cfg");
     {
         std::ofstream out(local, std::ios::binary);
         out << "name=Local\nversion=1.4\ncreatedby=me\ncreated=today\n";

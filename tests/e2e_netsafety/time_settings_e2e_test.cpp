@@ -84,7 +84,8 @@ TEST_F(TimeSettingsE2eTest, TestingAServerAnswersItsTime) {
         const char* text;
     };
     const Refused refused[] = {
-        {"ntp.elsewhere.org", sim::kStatusTimedOut, "TestTimeServer: no answer from the time server \"ntp.elsewhere.org\""},
+        {"ntp.elsewhere.org", sim::kStatusTimedOut,
+         "TestTimeServer: no answer from the time server \"ntp.elsewhere.org\""},
         {"", sim::kStatusBadArgument, "TestTimeServer: expected -timeserver"},
         {"bad_name", sim::kStatusBadArgument, "TestTimeServer: expected -timeserver"},
     };
