@@ -251,28 +251,44 @@ std::variant<std::size_t, Reply> Locate(const VisionState& vision, const Command
     return std::size_t{*index};
 }
 
-// Finds the command's camera, checks what it needs and lets `change` have
-// it, all under one hold of the controller. change(VisionState&, Camera&,
-// index) returns the reply.
-template <typename Change>
-Reply OnCamera(ControllerModel& controller, const Command& command, TextView key, Needs needs, Change change) {
+// Finds the command's camera, checks what it needs and lets `use` have it,
+// all under one hold of the controller: use(VisionState&, Camera&,
+// arguments, index) returns the reply. Reading commands leave the state as
+// it is.
+template <bool Changes, typename Use>
+Reply OnCamera(ControllerModel& controller, const Command& command, TextView key, Needs needs, Use use) {
     const auto arguments = Arguments::Parse(command.args);
     if (!arguments) {
         return Refused(command, kStatusBadArgument, OLESTR("cannot read ") + Quoted(command.args));
     }
-    return controller.Update([&](ModelState& state, EventPosts&) -> Reply {
-        VisionState& vision = state.Part<VisionState>();
+    auto serve = [&](auto& vision) -> Reply {
         auto located = Locate(vision, command, *arguments, key);
         if (auto* refusal = std::get_if<Reply>(&located)) {
             return std::move(*refusal);
         }
         const std::size_t index = std::get<std::size_t>(located);
-        Camera& camera = vision.cameras[index];
+        auto& camera = vision.cameras[index];
         if (auto unmet = Unmet(command, camera, needs)) {
             return std::move(*unmet);
         }
-        return change(vision, camera, *arguments, index);
-    });
+        return use(vision, camera, *arguments, index);
+    };
+    if constexpr (Changes) {
+        return controller.Update(
+            [&](ModelState& state, EventPosts&) { return serve(state.Part<VisionState>()); });
+    } else {
+        return controller.Read([&](const ModelState& state) { return serve(state.Part<VisionState>()); });
+    }
+}
+
+template <typename Change>
+Reply ChangeCamera(ControllerModel& controller, const Command& command, TextView key, Needs needs, Change change) {
+    return OnCamera<true>(controller, command, key, needs, change);
+}
+
+template <typename Look>
+Reply ReadCamera(ControllerModel& controller, const Command& command, TextView key, Look look) {
+    return OnCamera<false>(controller, command, key, Needs::Listed, look);
 }
 
 // Names, user names and DNS suffixes go into replies as one word.
@@ -318,10 +334,10 @@ Reply IsValid(ControllerModel& controller, const Command& command) {
 }
 
 Reply Status(ControllerModel& controller, const Command& command) {
-    return OnCamera(controller, command, OLESTR("-Camera"), Needs::Listed,
-                    [](VisionState&, Camera& camera, const Arguments&, std::size_t) {
-                        return Answer(Text(StatusWord(camera.state)));
-                    });
+    return ReadCamera(controller, command, OLESTR("-Camera"),
+                      [](const VisionState&, const Camera& camera, const Arguments&, std::size_t) {
+                          return Answer(Text(StatusWord(camera.state)));
+                      });
 }
 
 Reply Count(ControllerModel& controller, const Command&) {
@@ -333,16 +349,16 @@ Reply Count(ControllerModel& controller, const Command&) {
 template <Grammar G>
 Reply Info(ControllerModel& controller, const Command& command) {
     const TextView key = G == Grammar::ByName || G == Grammar::ByName2 ? OLESTR("-Camera") : OLESTR("-CameraIdx");
-    return OnCamera(controller, command, key, Needs::Listed,
-                    [](VisionState&, Camera& camera, const Arguments&, std::size_t index) {
-                        return Answer(InfoText(camera, index, G));
-                    });
+    return ReadCamera(controller, command, key,
+                      [](const VisionState&, const Camera& camera, const Arguments&, std::size_t index) {
+                          return Answer(InfoText(camera, index, G));
+                      });
 }
 
 // The name is given to the camera itself, so it must be on the network and
 // not running; naming a camera that is not configured yet configures it.
 Reply Rename(ControllerModel& controller, const Command& command) {
-    return OnCamera(controller, command, OLESTR("-Idx"), Needs::NotRunning,
+    return ChangeCamera(controller, command, OLESTR("-Idx"), Needs::NotRunning,
                     [&](VisionState& vision, Camera& camera, const Arguments& arguments, std::size_t) -> Reply {
                         const TextView name = arguments.Find(OLESTR("-Camera")).value_or(TextView());
                         if (!IsCameraName(name)) {
@@ -367,7 +383,7 @@ Reply Rename(ControllerModel& controller, const Command& command) {
 
 // "-State 1" program, "-State 2" running.
 Reply SetState(ControllerModel& controller, const Command& command) {
-    return OnCamera(controller, command, OLESTR("-Camera"), Needs::Configured,
+    return ChangeCamera(controller, command, OLESTR("-Camera"), Needs::Configured,
                     [&](VisionState&, Camera& camera, const Arguments& arguments, std::size_t) -> Reply {
                         const auto number = arguments.Unsigned(OLESTR("-State"));
                         if (!number || (*number != 1 && *number != 2)) {
@@ -382,7 +398,7 @@ Reply SetState(ControllerModel& controller, const Command& command) {
 
 // Fixed settings take effect at once and end DHCP.
 Reply SetIp(ControllerModel& controller, const Command& command) {
-    return OnCamera(
+    return ChangeCamera(
         controller, command, OLESTR("-Camera"), Needs::NotRunning,
         [&](VisionState& vision, Camera& camera, const Arguments& arguments, std::size_t) -> Reply {
             const auto address = ParseIpv4(arguments.Find(OLESTR("-Address")).value_or(TextView()));
@@ -409,7 +425,7 @@ Reply SetIp(ControllerModel& controller, const Command& command) {
 }
 
 Reply SetDhcp(ControllerModel& controller, const Command& command) {
-    return OnCamera(controller, command, OLESTR("-Camera"), Needs::NotRunning,
+    return ChangeCamera(controller, command, OLESTR("-Camera"), Needs::NotRunning,
                     [](VisionState& vision, Camera& camera, const Arguments&, std::size_t) {
                         if (camera.lease == 0) {
                             camera.lease = vision.nextLease++;
@@ -421,7 +437,7 @@ Reply SetDhcp(ControllerModel& controller, const Command& command) {
 
 // An empty server or suffix is none.
 Reply SetDns(ControllerModel& controller, const Command& command) {
-    return OnCamera(
+    return ChangeCamera(
         controller, command, OLESTR("-Camera"), Needs::NotRunning,
         [&](VisionState&, Camera& camera, const Arguments& arguments, std::size_t) -> Reply {
             const auto serverText = arguments.Find(OLESTR("-DNSServer"));
@@ -441,7 +457,7 @@ Reply SetDns(ControllerModel& controller, const Command& command) {
 }
 
 Reply Flash(ControllerModel& controller, const Command& command) {
-    return OnCamera(controller, command, OLESTR("-Camera"), Needs::Connected,
+    return ChangeCamera(controller, command, OLESTR("-Camera"), Needs::Connected,
                     [](VisionState&, Camera& camera, const Arguments&, std::size_t) {
                         ++camera.ledFlashes;
                         return Done();
@@ -451,7 +467,7 @@ Reply Flash(ControllerModel& controller, const Command& command) {
 // The login is the controller's own record, kept also for a camera that is
 // away.
 Reply SetCredentials(ControllerModel& controller, const Command& command) {
-    return OnCamera(controller, command, OLESTR("-CameraIdx"), Needs::Listed,
+    return ChangeCamera(controller, command, OLESTR("-CameraIdx"), Needs::Listed,
                     [&](VisionState&, Camera& camera, const Arguments& arguments, std::size_t) -> Reply {
                         const auto user = arguments.Find(OLESTR("-Username"));
                         const auto password = arguments.Find(OLESTR("-Password"));
