@@ -175,5 +175,13 @@ TEST(EnumNamesTest, EveryGeneratedNameReadsBackToItsValue) {
     EXPECT_STREQ("ITavPanel4", kInterfaceName<ITavPanel4>);
 }
 
+TEST(EnumNamesTest, TheLastPartOfANameReadsBackWhenNoOtherNameSharesIt) {
+    constexpr EnumName kNames[] = {{1, "Cam_Running"}, {2, "Cam_Program"}, {3, "Lan_Program"}, {4, "Plain"}};
+    EXPECT_EQ(1, ValueOf(kNames, "running"));
+    EXPECT_EQ(4, ValueOf(kNames, "plain"));
+    EXPECT_EQ(std::nullopt, ValueOf(kNames, "program"));
+    EXPECT_EQ(std::nullopt, ValueOf(kNames, "ning"));
+}
+
 }  // namespace
 }  // namespace tavctl::test

@@ -50,7 +50,19 @@ std::optional<long> ValueOf(std::span<const EnumName> names, std::string_view na
             return entry.value;
         }
     }
-    return std::nullopt;
+    // "running" for CameraStatus_Running: the part after the prefix, when only one name has it.
+    std::optional<long> shortMatch;
+    for (const EnumName& entry : names) {
+        const std::string_view full = entry.name;
+        const auto underscore = full.rfind('_');
+        if (underscore != std::string_view::npos && Lower(full.substr(underscore + 1)) == wanted) {
+            if (shortMatch) {
+                return std::nullopt;
+            }
+            shortMatch = entry.value;
+        }
+    }
+    return shortMatch;
 }
 
 std::string NameList(std::span<const EnumName> names) {

@@ -21,8 +21,13 @@ int Mode(Verb& v) {
     v.End();
     return v.Get("GetSafeyModeStatus", &S::GetSafeyModeStatus, &S::UnpackSafetyModeStatus);
 }
+// The controller's own words for the modes.
+constexpr EnumName kModeWords[] = {{VantorSafetyModeActiveMode, "active"},
+                                   {VantorSafetyModeCommissioningMode, "commissioning"},
+                                   {VantorSafetyModeServiceMode, "service"}};
+
 int SetMode(Verb& v) {
-    const auto mode = v.Enum<TavVantorSafetyMode>("MODE");
+    const auto mode = v.Enum<TavVantorSafetyMode>("MODE", kModeWords);
     v.End();
     return v.Set("SetSafetyMode", &S::SetSafetyMode, mode);
 }
@@ -215,7 +220,8 @@ constexpr VerbSpec kSafety[] = {
     {"load-status", "", "print whether loading a configuration is permitted (GetLoadOperationStatus)", LoadStatus},
     {"mode", "", "print the safety mode (GetSafeyModeStatus)", Mode},
     {"set-mode", "MODE", "set the safety mode (SetSafetyMode)", SetMode,
-     "MODE: a TavVantorSafetyMode name (VantorSafetyModeActiveMode, ...) or number.\n"},
+     "MODE: active, commissioning, service, a TavVantorSafetyMode name\n"
+     "(VantorSafetyModeActiveMode, ...) or a number.\n"},
     {"info", "", "print the configuration information (GetSafetyConfigurationInfo)", Info},
     {"validate", "BY", "mark the configuration validated (SetSafetyConfigurationValidated)", Validate},
     {"unvalidate", "", "mark the configuration not validated (SetSafetyConfigurationNotValidated)", Unvalidate},

@@ -204,7 +204,8 @@ constexpr VerbSpec kCamera[] = {
      Info},
     {"rename", "INDEX NAME", "rename a camera (SetCameraName)", Rename},
     {"state", "CAMERA STATE", "set a camera's state (SetCameraState)", State,
-     "STATE: a TavCameraStatus name (CameraStatus_Program, CameraStatus_Running, ...).\n"},
+     "STATE: a TavCameraStatus name (CameraStatus_Program, CameraStatus_Running, ...),\n"
+     "or its last part (program, running).\n"},
     {"ip", "CAMERA ADDRESS MASK GATEWAY", "set a camera's IP settings (SetCameraIPSettings)", Ip},
     {"dns", "CAMERA SERVER SUFFIX", "set a camera's DNS settings (SetCameraDNSSettings)", Dns},
     {"dhcp", "CAMERA", "let a camera use DHCP (SetCameraDHCP)", Dhcp},
