@@ -96,7 +96,7 @@ const DecoderRow kRows[] = {
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavPanel>()->UnpackCollisionDetectState(d, o.Number<TavCollisionDetectState>());
      }},
-    {"UnpackAutoConditions", "Get", "Mode", "", "AUTO_CH -auto_ch 1 -noelts 2\tBlk;1;7\tDeact;0;8\t",
+    {"UnpackAutoConditions", nullptr, nullptr, nullptr, "-auto_ch 1 -noelts 2\tBlk;1;7\tDeact;0;8\t",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavPanel>()->UnpackAutoConditions(d, o.Number<LONG>(), o.Enumerator<IEnumAutoCondition>());
      }},
@@ -142,11 +142,13 @@ const DecoderRow kRows[] = {
          return As<ITavSafety>()->UnpackSafetyModeStatus(d, o.Number<TavVantorSafetyMode>());
      }},
     {"UnpackSafetyConfigurationInfo", "Get", "SafetyConf", "",
-     "-minv 1\t-majv 2\t-islocked 1\t-vdate 2024-01-02\t-vby tester\t-crdate 2024-01-01\t-crby author\t"
-     "-cnfname cell\t-csum 000102030405060708090A0B0C0D0E0F101112131415161718191A1B1C1D1E1F\t",
-     [](VARIANT* d, robustness::OutValues& o) { return As<ITavSafety>()->UnpackSafetyConfigurationInfo(d, o.ConfigInfo()); }},
-    {"UnpackSafetyViolationStatus", "Get", "VantorViolationInfo", "-driver_module 0 -last_violation 1", "",
-     DecodeViolation},
+     "-minv 1\t-majv 2\t-islocked 1\t-lockdt 2024-01-03\t-lockby locker\t-valid 1\t-vdate 2024-01-02\t-vby tester\t-crdate 2024-01-01\t-crby author\t"
+     "-cnfnm cell\t-csum 000102030405060708090A0B0C0D0E0F101112131415161718191A1B1C1D1E1F\t",
+     [](VARIANT* d, robustness::OutValues& o) { return As<ITavSafety>()->UnpackSafetyConfigurationInfo(d, o.ConfigInfo()); },
+     robustness::OutValues::kKeepsFilledOnFailure},
+    {"UnpackSafetyViolationStatus", "Get", "VantorViolationInfo", "-driver_module 0 -last_violation 1", 
+     "-vnumber 7 -violationtype stz -instanceid 3 -isunsync 0 -tool 1 -drive 2 -axes 6[1.5,2,3,4,5,6, -speed 6[0,0,0,0,0,0, -tcp 3[1,2,3, -fpos 3[1,2,3, -forient 4[1,0,0,0, -ssv 4[1010 -toolposvs 4[0000 -toolposas 4[1111 -uarmvs 4[0100 -toolspeedvs 4[0000 -toolspeedas 4[0000 -axisrangevs 4[0000 -axisrangeas 4[0000",
+     DecodeViolation, robustness::OutValues::kKeepsFilledOnFailure},
     {"UnpackPSCUnitStatus", "Get", "PSCUnitStatus", "", "-noelts 2\t1;0;0\t2;3;-2147467259\t",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavPositionalSafetyController>()->UnpackPSCUnitStatus(d, o.Retrieval(),
@@ -199,7 +201,8 @@ const DecoderRow kRows[] = {
      }},
     {"UnpackNumberOfCameras", "Get", "LMNumberOfCameras", "", "-CameraCount 3",
      [](VARIANT* d, robustness::OutValues& o) { return As<ITavLumeret>()->UnpackNumberOfCameras(d, o.Number<ULONG>()); }},
-    {"UnpackCameraInfoUsingIndex", "Get", "LMCameraInfoUsingIndex", "-CameraIdx 0", "",
+    {"UnpackCameraInfoUsingIndex", "Get", "LMCameraInfoUsingIndex", "-CameraIdx 0", 
+     "-currIPAddress \"10.0.0.9 -currSubnetMask \"255.0.0.0 -currDefaultGateway \"10.0.0.1 -currHostName \"cam1 -currDNSServer \"10.0.0.2 -currDNSSuffix \"local -currIsDHCPEnabled 0 -confIPAddress \"10.0.0.9 -confSubnetMask \"255.0.0.0 -confDefaultGateway \"10.0.0.1 -confHostName \"cam1 -confDNSServer \"10.0.0.2 -confDNSSuffix \"local -confIsDHCPEnabled 0 -confCameraName \"cam1 -cameraName \"cam1 -macAddress \"00:11:22:33:44:55 -Status \"Running\"",
      [](VARIANT* d, robustness::OutValues& o) {
          BSTR* s[15];
          for (BSTR*& slot : s) slot = o.String();
@@ -208,7 +211,8 @@ const DecoderRow kRows[] = {
                                                               s[11], o.Number<LONG>(), s[12], s[13], s[14],
                                                               o.Number<TavCameraStatus>());
      }},
-    {"UnpackCameraInfo", "Get", "LMCameraInfo", "-Camera cam1", "",
+    {"UnpackCameraInfo", "Get", "LMCameraInfo", "-Camera cam1", 
+     "-currIPAddress \"10.0.0.9 -currSubnetMask \"255.0.0.0 -currDefaultGateway \"10.0.0.1 -currHostName \"cam1 -currDNSServer\"10.0.0.2 -currDNSSuffix \"local -currIsDHCPEnabled 0 -confIPAddress \"10.0.0.9 -confSubnetMask \"255.0.0.0 -confDefaultGateway \"10.0.0.1 -confHostName \"cam1 -confDNSServer \"10.0.0.2 -ConfDNSSuffix \"local -confIsDHCPEnabled 0 -confCameraName \"cam1 -cameraIdx 0 -macAddress\"00:11:22:33:44:55  -Status \"Running\"",
      [](VARIANT* d, robustness::OutValues& o) {
          BSTR* s[14];
          for (BSTR*& slot : s) slot = o.String();
@@ -216,7 +220,8 @@ const DecoderRow kRows[] = {
                                                     s[7], s[8], s[9], s[10], s[11], o.Number<LONG>(), s[12],
                                                     o.Number<ULONG>(), s[13], o.Number<TavCameraStatus>());
      }},
-    {"UnpackCameraInfo2", "Get", "LMCameraInfo2", "-Camera cam1", "",
+    {"UnpackCameraInfo2", "Get", "LMCameraInfo2", "-Camera cam1", 
+     "-currIPAddress \"10.0.0.9 -currSubnetMask \"255.0.0.0 -currDefaultGateway \"10.0.0.1 -currHostName \"cam1 -currDNSServer\"10.0.0.2 -currDNSSuffix \"local -currIsDHCPEnabled 0 -confIPAddress \"10.0.0.9 -confSubnetMask \"255.0.0.0 -confDefaultGateway \"10.0.0.1 -confHostName \"cam1 -confDNSServer \"10.0.0.2 -ConfDNSSuffix \"local -confIsDHCPEnabled 0 -confCameraName \"cam1 -cameraIdx 0 -macAddress\"00:11:22:33:44:55  -Status \"Running  -username \"operator\"",
      [](VARIANT* d, robustness::OutValues& o) {
          BSTR* s[15];
          for (BSTR*& slot : s) slot = o.String();
@@ -224,7 +229,8 @@ const DecoderRow kRows[] = {
                                                       s[6], s[7], s[8], s[9], s[10], s[11], o.Number<LONG>(), s[12],
                                                       o.Number<ULONG>(), s[13], o.Number<TavCameraStatus>(), s[14]);
      }},
-    {"UnpackCameraInfoUsingIndex2", "Get", "LMCameraInfoUsingIndex2", "-CameraIdx 0", "",
+    {"UnpackCameraInfoUsingIndex2", "Get", "LMCameraInfoUsingIndex2", "-CameraIdx 0", 
+     "-currIPAddress \"10.0.0.9 -currSubnetMask \"255.0.0.0 -currDefaultGateway \"10.0.0.1 -currHostName \"cam1 -currDNSServer \"10.0.0.2 -currDNSSuffix \"local -currIsDHCPEnabled 0 -confIPAddress \"10.0.0.9 -confSubnetMask \"255.0.0.0 -confDefaultGateway \"10.0.0.1 -confHostName \"cam1 -confDNSServer \"10.0.0.2 -confDNSSuffix \"local -confIsDHCPEnabled 0 -confCameraName \"cam1 -cameraName \"cam1 -macAddress \"00:11:22:33:44:55 -Status \"Running -username \"operator\"",
      [](VARIANT* d, robustness::OutValues& o) {
          BSTR* s[16];
          for (BSTR*& slot : s) slot = o.String();

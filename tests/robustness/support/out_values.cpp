@@ -133,12 +133,12 @@ std::string OutValues::Check(HRESULT hr) {
             if (!mayKeep) note(succeeded ? "left a string out-value unwritten" : "did not clear a string out-value");
         } else if (succeeded && *text == nullptr && !nullReplyText_ && (quirks_ & kNullOnSuccess) == 0) {
             note("handed out a NULL string");
-        } else if (!succeeded && hr != E_OUTOFMEMORY && *text != nullptr) {
+        } else if (!succeeded && hr != E_OUTOFMEMORY && (quirks_ & kKeepsFilledOnFailure) == 0 && *text != nullptr) {
             // After a failed allocation the strings already handed out stay with the caller.
             note("handed out a string with a failure");
         }
     }
-    if (!succeeded) {
+    if (!succeeded && (quirks_ & kKeepsFilledOnFailure) == 0) {
         for (const NumberRef& number : numbers_) {
             if (!IsUnwritten(number.address, number.size) && !Zero(number.address, number.size)) {
                 note("wrote a number out-value other than zero with a failure");

@@ -24,6 +24,8 @@ public:
         kTypeCheckedFirst = 1,
         // A success may hand out a NULL string (a reply without the value).
         kNullOnSuccess = 2,
+        // What was filled before a failure stays with the caller.
+        kKeepsFilledOnFailure = 4,
     };
     // A NULL BSTR in the reply may be passed on whole as a NULL string.
     explicit OutValues(bool nullReplyText, unsigned quirks = kNone)
