@@ -99,12 +99,14 @@ const DecoderRow kRows[] = {
     {"UnpackAutoConditions", nullptr, nullptr, nullptr, "-auto_ch 1 -noelts 2\tBlk;1;7\tDeact;0;8\t",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavPanel>()->UnpackAutoConditions(d, o.Number<LONG>(), o.Enumerator<IEnumAutoCondition>());
-     }},
+     },
+     robustness::OutValues::kKeepsFilledOnFailure},
     {"UnpackOperationMode2", "Get", "Mode", "", "AUTO_CH -auto_ch 1 -noelts 1\tRunMode;0;250\t",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavPanel2>()->UnpackOperationMode2(d, o.Number<TavOperationMode>(),
                                                        o.Enumerator<IEnumAutoCondition2>(), o.Number<ULONG>());
-     }},
+     },
+     robustness::OutValues::kKeepsFilledOnFailure},
     {"UnpackOPModePinCodeLockState", "Get", "OPModePinCodeLockState", "", "-lockstate locked",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavPanel3>()->UnpackOPModePinCodeLockState(d, o.Number<TavOPModeLockState>());
