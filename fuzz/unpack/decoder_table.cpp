@@ -84,7 +84,7 @@ const DecoderRow kRows[] = {
      [](VARIANT* d, robustness::OutValues& o) { return As<ITavController5>()->UnpackVersionName(d, o.String()); }},
     {"UnpackProductVersionName", "Get", "ProductVersionName", "-Name \"TavOS\"", "-Name \"7.4.2\"",
      [](VARIANT* d, robustness::OutValues& o) { return As<ITavController6>()->UnpackProductVersionName(d, o.String()); }},
-    {"UnpackControllerState", "Get", "State", "", "-State motoron",
+    {"UnpackControllerState", "Get", "State", "", "RUN",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavPanel>()->UnpackControllerState(d, o.Number<TavControllerState>());
      }},
@@ -92,7 +92,7 @@ const DecoderRow kRows[] = {
      [](VARIANT* d, robustness::OutValues& o) { return As<ITavPanel>()->UnpackOperationMode(d, o.Number<TavOperationMode>()); }},
     {"UnpackSpeedRatio", "Get", "SpeedAdjust", "", "50",
      [](VARIANT* d, robustness::OutValues& o) { return As<ITavPanel>()->UnpackSpeedRatio(d, o.Number<short>()); }},
-    {"UnpackCollisionDetectState", "Get", "ColdetState", "", "-ColdetState TRIGGERED",
+    {"UnpackCollisionDetectState", "Get", "ColdetState", "", "TRIGGERED",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavPanel>()->UnpackCollisionDetectState(d, o.Number<TavCollisionDetectState>());
      }},
@@ -242,31 +242,35 @@ const DecoderRow kRows[] = {
                                                                 o.Number<TavCameraStatus>(), s[15]);
      }},
     {"UnpackTimeZone", "Get", "TimeZone", "", "-timezone CET",
-     [](VARIANT* d, robustness::OutValues& o) { return As<ITavControllerTime>()->UnpackTimeZone(d, o.String()); }, robustness::OutValues::kTypeCheckedFirst},
+     [](VARIANT* d, robustness::OutValues& o) { return As<ITavControllerTime>()->UnpackTimeZone(d, o.String()); }, robustness::OutValues::kTypeCheckedFirst | robustness::OutValues::kNullOnSuccess},
     {"UnpackTimeServer", "Get", "TimeServer", "", "-timeserver ntp",
-     [](VARIANT* d, robustness::OutValues& o) { return As<ITavControllerTime>()->UnpackTimeServer(d, o.String()); }, robustness::OutValues::kTypeCheckedFirst},
+     [](VARIANT* d, robustness::OutValues& o) { return As<ITavControllerTime>()->UnpackTimeServer(d, o.String()); }, robustness::OutValues::kTypeCheckedFirst | robustness::OutValues::kNullOnSuccess},
     {"UnpackTestTimeServer", "Set", "TestTimeServer", "-timeserver \"ntp\"", "-time_t 5",
      [](VARIANT* d, robustness::OutValues& o) { return As<ITavControllerTime>()->UnpackTestTimeServer(d, o.Time()); }},
     {"UnpackManualModePrivRequestEvent", nullptr, nullptr, nullptr, "",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavUser>()->UnpackManualModePrivRequestEvent(d, o.Login(), o.Number<ULONG>(),
                                                                  o.Number<TavManualModePrivileges>());
-     }},
+     },
+     robustness::OutValues::kNullOnSuccess},
     {"UnpackManualModePrivilegesState", nullptr, nullptr, nullptr, "",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavUser>()->UnpackManualModePrivilegesState(d, 1, o.Number<TavManualModePrivilegesState>(),
                                                                 o.Login(), o.Number<LONG>());
-     }},
+     },
+     robustness::OutValues::kNullOnSuccess},
     {"UnpackPendingManualModePrivRequest", nullptr, nullptr, nullptr, "",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavUser2>()->UnpackPendingManualModePrivRequest(d, o.Login(), o.Number<ULONG>(),
                                                                    o.Number<TavManualModePrivileges>());
-     }},
+     },
+     robustness::OutValues::kNullOnSuccess},
     {"UnpackCurrentMaster", nullptr, nullptr, nullptr, "",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavMastership>()->UnpackCurrentMaster(d, 1, o.Number<TavMastershipStatus>(), o.Login(),
                                                           o.Number<LONG>());
-     }},
+     },
+     robustness::OutValues::kNullOnSuccess},
     {"UnpackStorageDevices", "Get", "StorageDevice", "", "-noelts 1\tHD0a;Fixed;1;0\t",
      [](VARIANT* d, robustness::OutValues& o) {
          return As<ITavDynamicDevices>()->UnpackStorageDevices(d, o.Retrieval(), o.Enumerator<IEnumStorageDevices>());

@@ -123,7 +123,8 @@ std::string OutValues::Check(HRESULT hr) {
     const bool succeeded = SUCCEEDED(hr);
     // An operation that is not provided touches nothing.
     const bool notProvided = hr == E_NOTIMPL;
-    const bool mayKeep = notProvided || (hr == E_FAIL && (quirks_ & kTypeCheckedFirst) != 0);
+    const bool mayKeep = notProvided || (hr == E_FAIL && (quirks_ & kTypeCheckedFirst) != 0) ||
+                         (!succeeded && (quirks_ & kUntouchedOnFailure) != 0);
     std::string fault;
     const auto note = [&fault](const char* what) {
         if (fault.empty()) fault = what;
@@ -138,7 +139,8 @@ std::string OutValues::Check(HRESULT hr) {
             note("handed out a string with a failure");
         }
     }
-    if (!succeeded && (quirks_ & kKeepsFilledOnFailure) == 0) {
+    // After a failed allocation what was already handed out stays too.
+    if (!succeeded && hr != E_OUTOFMEMORY && (quirks_ & kKeepsFilledOnFailure) == 0) {
         for (const NumberRef& number : numbers_) {
             if (!IsUnwritten(number.address, number.size) && !Zero(number.address, number.size)) {
                 note("wrote a number out-value other than zero with a failure");

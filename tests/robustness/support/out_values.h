@@ -26,6 +26,9 @@ public:
         kNullOnSuccess = 2,
         // What was filled before a failure stays with the caller.
         kKeepsFilledOnFailure = 4,
+        // A failure may come before anything is written (a command that
+        // could not be built or sent leaves its out-values alone).
+        kUntouchedOnFailure = 8,
     };
     // A NULL BSTR in the reply may be passed on whole as a NULL string.
     explicit OutValues(bool nullReplyText, unsigned quirks = kNone)
