@@ -168,7 +168,7 @@ std::vector<Operation> MixedOperations() {
         },
         [](const ComPtr<ITavController>& c, TavInParams* rip) {
             TavVTState state{};
-            return View<ITavVirtualTime>(c)->GetVTState(rip, &state);
+            return View<ITavVirtualTime>(c)->VTGetState(rip, &state);
         },
         [](const ComPtr<ITavController>& c, TavInParams* rip) {
             Bstr name;
@@ -212,7 +212,7 @@ std::vector<Operation> MixedOperations() {
             TavMastershipStatus status{};
             TavLoginInfo login{};
             LONG me = 0;
-            const HRESULT hr = View<ITavMastership>(c)->GetCurrentMaster(rip, MasterResource_Kesto, &status, &login,
+            const HRESULT hr = View<ITavMastership>(c)->GetCurrentMaster(rip, ResourceKESTO, &status, &login,
                                                                        &me);
             SysFreeString(login.userAlias);
             SysFreeString(login.location);
