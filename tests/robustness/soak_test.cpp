@@ -244,7 +244,7 @@ void FlipFaults(sim::ControllerModel& controller, std::mt19937& random) {
                                                OLESTR("Mode"),     OLESTR("SpeedAdjust"), OLESTR("SlotInfo")};
     auto& faults = controller.Faults();
     const OLECHAR* command = kCommands[random() % std::size(kCommands)];
-    switch (random() % 6) {
+    switch (random() % 8) {
         case 0:
             faults.FailTransport();
             break;
@@ -259,6 +259,12 @@ void FlipFaults(sim::ControllerModel& controller, std::mt19937& random) {
             break;
         case 4:
             faults.SetDelay(command, std::chrono::milliseconds(random() % 20));
+            break;
+        case 5:
+            faults.GarbleReplies(command);
+            break;
+        case 6:
+            faults.ClearGarbling(command);
             break;
         default:
             faults.Clear();
