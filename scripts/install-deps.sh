@@ -8,7 +8,8 @@ packages=(
 )
 case "${1:-all}" in
   main) ;;
-  all) packages+=(g++-mingw-w64-x86-64 wine64 qemu-user g++-arm-linux-gnueabihf libc6-dev-armhf-cross) ;;
+  all) packages+=(g++-mingw-w64-x86-64 wine64 qemu-user g++-arm-linux-gnueabihf libc6-dev-armhf-cross
+                 clang-16 libclang-rt-16-dev) ;;
   *) echo "usage: $0 [main|all]" >&2; exit 2 ;;
 esac
 missing=()

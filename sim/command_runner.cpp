@@ -23,7 +23,12 @@ std::optional<Reply> Carry(ControllerModel& controller, const Command& command, 
     if (auto failure = controller.Faults().FailureFor(command.name)) {
         return Refuse(failure->status, std::move(failure->text));
     }
-    return Dispatch(controller, command);
+    Reply reply = Dispatch(controller, command);
+    if (reply.status == S_OK && reply.hasText && controller.Faults().Garbles(command.name)) {
+        reply.text.resize(reply.text.size() / 2);
+        reply.text += OLESTR("\x7f");
+    }
+    return reply;
 }
 
 }  // namespace

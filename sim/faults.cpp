@@ -2,7 +2,7 @@
 
 namespace tav::sim {
 
-void FaultSwitches::Rearm() { armed_ = !delays_.empty() || !commandFailures_.empty(); }
+void FaultSwitches::Rearm() { armed_ = !delays_.empty() || !commandFailures_.empty() || !garbled_.empty(); }
 
 void FaultSwitches::SetDelay(TextView command, std::chrono::milliseconds delay) {
     std::lock_guard lock(mutex_);
@@ -90,11 +90,34 @@ std::optional<Failure> FaultSwitches::FailureFor(TextView command) const {
     return found->second;
 }
 
+void FaultSwitches::GarbleReplies(TextView command) {
+    std::lock_guard lock(mutex_);
+    garbled_.emplace(command);
+    Rearm();
+}
+
+void FaultSwitches::ClearGarbling(TextView command) {
+    std::lock_guard lock(mutex_);
+    if (const auto found = garbled_.find(command); found != garbled_.end()) {
+        garbled_.erase(found);
+    }
+    Rearm();
+}
+
+bool FaultSwitches::Garbles(TextView command) const {
+    if (!armed_) {
+        return false;
+    }
+    std::lock_guard lock(mutex_);
+    return garbled_.find(command) != garbled_.end();
+}
+
 void FaultSwitches::Clear() {
     {
         std::lock_guard lock(mutex_);
         delays_.clear();
         commandFailures_.clear();
+        garbled_.clear();
         Rearm();
     }
     RestoreTransport();

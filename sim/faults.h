@@ -5,6 +5,7 @@
 #include <map>
 #include <mutex>
 #include <optional>
+#include <set>
 
 #include "sim/status_codes.h"
 #include "sim/text.h"
@@ -37,6 +38,13 @@ public:
     void ClearCommandFailure(TextView command);
     std::optional<Failure> FailureFor(TextView command) const;
 
+    // Every later successful reply to `command` arrives cut short and ends in
+    // a character no grammar expects, as from a controller whose answer was
+    // mangled on the way.
+    void GarbleReplies(TextView command);
+    void ClearGarbling(TextView command);
+    bool Garbles(TextView command) const;
+
     void Clear();
 
     // Told when the transport goes down (false) or comes back (true).
@@ -52,6 +60,7 @@ private:
     mutable std::mutex mutex_;
     std::map<Text, std::chrono::milliseconds, std::less<>> delays_;
     std::map<Text, Failure, std::less<>> commandFailures_;
+    std::set<Text, std::less<>> garbled_;
     std::optional<Failure> transport_;
     std::function<void(bool)> transportListener_;
 };

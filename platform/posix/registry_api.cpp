@@ -17,7 +17,6 @@
 namespace tav::posix {
 namespace {
 
-constexpr std::size_t longestKeyName = 255;
 
 struct KeyLocation {
     RegistryRoot root = RegistryRoot::LocalMachine;
@@ -91,7 +90,7 @@ LSTATUS SplitSubkey(LPCWSTR subkey, std::vector<std::u16string>& names) {
         std::size_t separator = rest.find(u'\\');
         std::u16string_view name = rest.substr(0, separator);
         if (name.empty()) return ERROR_BAD_PATHNAME;
-        if (name.size() > longestKeyName) return ERROR_INVALID_PARAMETER;
+        if (name.size() > kLongestKeyName) return ERROR_INVALID_PARAMETER;
         names.emplace_back(name);
         if (separator == std::u16string_view::npos) return ERROR_SUCCESS;
         rest.remove_prefix(separator + 1);
@@ -153,6 +152,7 @@ LSTATUS OpenOrCreate(HKEY hKey, LPCWSTR lpSubKey, bool create, REGSAM access, PH
     if (status != ERROR_SUCCESS) return status;
     KeyLocation target = *base;
     target.path.insert(target.path.end(), names.begin(), names.end());
+    if (target.path.size() > kDeepestKey) return ERROR_INVALID_PARAMETER;
     target.access = SpecificRights(access);
     bool createdLast = false;
     auto& store = RegistryStore::Instance();

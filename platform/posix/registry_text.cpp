@@ -102,11 +102,14 @@ RegistryKey* ReadKeyLine(std::string_view path, RegistryTree& tree) {
     RegistryKey* key = rootName == "HKEY_CURRENT_USER"    ? &tree.Root(RegistryRoot::CurrentUser)
                        : rootName == "HKEY_LOCAL_MACHINE" ? &tree.Root(RegistryRoot::LocalMachine)
                                                           : nullptr;
-    while (key != nullptr && separator != std::string_view::npos) {
+    for (std::size_t depth = 1; key != nullptr && separator != std::string_view::npos; ++depth) {
         path.remove_prefix(separator + 1);
         separator = path.find('\\');
         std::u16string name;
-        if (!Unescape(path.substr(0, separator), name) || name.empty()) return nullptr;
+        if (depth > kDeepestKey || !Unescape(path.substr(0, separator), name) || name.empty() ||
+            name.size() > kLongestKeyName) {
+            return nullptr;
+        }
         bool created;
         key = &key->AddSubkey(name, created);
     }

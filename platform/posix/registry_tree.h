@@ -11,6 +11,11 @@
 
 namespace tav::posix {
 
+// Windows' own limits: a key name of 255 characters, 512 levels of keys. A
+// file that goes past them is refused rather than nested without end.
+constexpr std::size_t kLongestKeyName = 255;
+constexpr std::size_t kDeepestKey = 512;
+
 // Upper-cases ASCII and Latin-1 letters, which is as far as our names go.
 std::u16string FoldCase(std::u16string_view name);
 

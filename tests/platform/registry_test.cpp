@@ -240,6 +240,24 @@ TEST_F(Registry, ACorruptFileIsReportedAndNotOverwritten) {
     EXPECT_EQ(FileText(sandbox.File()), "not a registry\n");
 }
 
+// Windows stops at 512 levels of keys; a file nested deeper is refused as
+// corrupt rather than read (and written back) without end.
+TEST_F(Registry, KeysDeeperThanWindowsAllowsAreRefused) {
+    std::u16string deep;
+    for (int level = 0; level < 600; ++level) deep += u"k\\";
+    HKEY key = nullptr;
+    EXPECT_EQ(RegCreateKeyExW(HKEY_CURRENT_USER, reinterpret_cast<LPCWSTR>(deep.c_str()), 0, nullptr, 0,
+                              KEY_ALL_ACCESS, nullptr, &key, nullptr),
+              ERROR_INVALID_PARAMETER);
+    std::string path = "HKEY_CURRENT_USER";
+    for (int level = 0; level < 513; ++level) path += "\\k";
+    {
+        std::ofstream out(sandbox.File());
+        out << "; TavController registry 1\n[" << path << "]\n";
+    }
+    EXPECT_EQ(Open(OLESTR(""), key), ERROR_BADDB);
+}
+
 TEST_F(Registry, AKeyDeletedUnderAnOpenHandleIsReportedAsDeleted) {
     HKEY key = Create(OLESTR("Doomed"));
     ASSERT_EQ(RegDeleteTreeW(sandbox.Key(), OLESTR("Doomed")), ERROR_SUCCESS);

@@ -122,6 +122,18 @@ TEST_F(TransportTest, FailingCommandAnswersItsStatusAndIsNotCarriedOut) {
     EXPECT_NE("-Name \"blocked\"", Get("CtrlName").text);
 }
 
+TEST_F(TransportTest, GarbledCommandAnswersHalfItsReplyAndAMark) {
+    const std::string whole = Get("CtrlName").text;
+    controller_->Faults().GarbleReplies(T("CtrlName"));
+    const Outcome garbled = Get("CtrlName");
+    EXPECT_EQ(S_OK, garbled.status);
+    EXPECT_EQ(whole.substr(0, whole.size() / 2) + "\x7f", garbled.text);
+    EXPECT_EQ(S_OK, Set("CtrlName", "-Name \"kept\"").status);  // a reply without text is left alone
+
+    controller_->Faults().ClearGarbling(T("CtrlName"));
+    EXPECT_EQ("-Name \"kept\"", Get("CtrlName").text);
+}
+
 TEST_F(TransportTest, BadCallsFailExecuteAndLeaveAText) {
     const Bstr verb = B("Get");
     const Bstr command = B("State");

@@ -43,6 +43,9 @@ void ApplySimulatorFaults(const GlobalOptions& options) {
     for (const auto& [command, status] : options.simFailures) {
         controller->Faults().FailCommand(ToOle(command), status);
     }
+    for (const auto& command : options.simGarbled) {
+        controller->Faults().GarbleReplies(ToOle(command));
+    }
     if (options.simLinkDown) {
         controller->Faults().FailTransport();
     }

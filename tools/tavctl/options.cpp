@@ -128,6 +128,10 @@ std::optional<GlobalOptions> ParseGlobalOptions(const std::vector<std::string>& 
                 status = static_cast<HRESULT>(static_cast<std::uint32_t>(*code));
             }
             options.simFailures.emplace_back(text->substr(0, equals), status);
+        } else if (arg == "--sim-garble") {
+            const auto command = value(arg);
+            if (!command) return std::nullopt;
+            options.simGarbled.push_back(*command);
         } else if (arg == "--sim-link-down") {
             options.simLinkDown = true;
         } else if (arg == "--sim-plug") {
@@ -144,7 +148,8 @@ std::optional<GlobalOptions> ParseGlobalOptions(const std::vector<std::string>& 
     if (options.url.empty()) {
         options.url = "/sim";
     }
-    const bool faults = !options.simDelays.empty() || !options.simFailures.empty() || options.simLinkDown ||
+    const bool faults = !options.simDelays.empty() || !options.simFailures.empty() || !options.simGarbled.empty() ||
+                        options.simLinkDown ||
                         !options.simPlugged.empty();
     if (faults && !options.embedded) {
         Usage("the --sim-... switches need the embedded virtual controller (no --url, or --sim)");
@@ -185,6 +190,7 @@ std::string GeneralHelp() {
             "  --sim-delay CMD=MS   virtual controller: answer controller command CMD\n"
             "                       (e.g. SystemClock) after MS milliseconds\n"
             "  --sim-fail CMD[=HR]  virtual controller: answer CMD with failure status HR\n"
+            "  --sim-garble CMD     virtual controller: CMD's replies arrive cut short\n"
             "  --sim-link-down      virtual controller: the transport fails\n"
             "  --sim-plug DEVICE    virtual controller: plug in a removable storage\n"
             "                       device (e.g. usb1) holding a boot image and packages\n"

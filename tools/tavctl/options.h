@@ -26,6 +26,7 @@ struct GlobalOptions {
     // Fault switches of the embedded virtual controller.
     std::vector<std::pair<std::string, std::chrono::milliseconds>> simDelays;
     std::vector<std::pair<std::string, HRESULT>> simFailures;
+    std::vector<std::string> simGarbled;  // commands whose replies arrive mangled
     bool simLinkDown = false;
     std::vector<std::string> simPlugged;  // removable devices plugged in
 };
