@@ -52,4 +52,24 @@ private:
     const char* failure_ = nullptr;
 };
 
+// The main of a benchmark run against a client: reads the benchmark switches
+// (an unknown one ends the run with 1), makes the client, which the
+// benchmarks reach through `current`, lets `registerBenchmarks` add them, and
+// runs them with a Reporter.
+template <typename ClientType, typename Reporter, typename Register>
+int RunWithClient(int argc, char** argv, ClientType*& current, Register&& registerBenchmarks) {
+    benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
+        return 1;
+    }
+    ClientType client;
+    current = &client;
+    registerBenchmarks(client);
+    Reporter reporter;
+    benchmark::RunSpecifiedBenchmarks(&reporter);
+    benchmark::Shutdown();
+    current = nullptr;
+    return 0;
+}
+
 }  // namespace tav::bench

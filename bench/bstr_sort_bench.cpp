@@ -366,24 +366,15 @@ public:
 }  // namespace
 
 int main(int argc, char** argv) {
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
-        return 1;
-    }
-    Client client;
-    TheClient = &client;
-    if (client.Failure() == nullptr) {
-        if (const char* why = ClosedFormHolds()) {
-            client.Fail(why);
+    return tav::bench::RunWithClient<Client, RatioReporter>(argc, argv, TheClient, [](Client& client) {
+        if (client.Failure() == nullptr) {
+            if (const char* why = ClosedFormHolds()) {
+                client.Fail(why);
+            }
         }
-    }
-    for (const std::int64_t count : kSizes) {
-        benchmark::RegisterBenchmark("ITavEnumBSTR::Sort", Sort)->Arg(count)->Unit(benchmark::kMicrosecond);
-        benchmark::RegisterBenchmark("std::sort", StdSort)->Arg(count)->Unit(benchmark::kMicrosecond);
-    }
-    RatioReporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
-    benchmark::Shutdown();
-    TheClient = nullptr;
-    return 0;
+        for (const std::int64_t count : kSizes) {
+            benchmark::RegisterBenchmark("ITavEnumBSTR::Sort", Sort)->Arg(count)->Unit(benchmark::kMicrosecond);
+            benchmark::RegisterBenchmark("std::sort", StdSort)->Arg(count)->Unit(benchmark::kMicrosecond);
+        }
+    });
 }

@@ -210,19 +210,10 @@ public:
 }  // namespace
 
 int main(int argc, char** argv) {
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
-        return 1;
-    }
-    Client client;
-    TheClient = &client;
-    for (const std::int64_t count : kSizes) {
-        benchmark::RegisterBenchmark("UnpackAutoConditions", Unpack)->Arg(count);
-        benchmark::RegisterBenchmark("ScanOnly", Baseline)->Arg(count);
-    }
-    RatioReporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
-    benchmark::Shutdown();
-    TheClient = nullptr;
-    return 0;
+    return tav::bench::RunWithClient<Client, RatioReporter>(argc, argv, TheClient, [](Client&) {
+        for (const std::int64_t count : kSizes) {
+            benchmark::RegisterBenchmark("UnpackAutoConditions", Unpack)->Arg(count);
+            benchmark::RegisterBenchmark("ScanOnly", Baseline)->Arg(count);
+        }
+    });
 }

@@ -197,18 +197,9 @@ public:
 }  // namespace
 
 int main(int argc, char** argv) {
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
-        return 1;
-    }
-    Client client;
-    TheClient = &client;
-    benchmark::RegisterBenchmark("UnpackCameraInfo2", Subject);
-    benchmark::RegisterBenchmark("ScanOnly", Baseline);
-    benchmark::RegisterBenchmark("ScanAndAllocate", ScanAndAllocate);
-    RatioReporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
-    benchmark::Shutdown();
-    TheClient = nullptr;
-    return 0;
+    return tav::bench::RunWithClient<Client, RatioReporter>(argc, argv, TheClient, [](Client&) {
+        benchmark::RegisterBenchmark("UnpackCameraInfo2", Subject);
+        benchmark::RegisterBenchmark("ScanOnly", Baseline);
+        benchmark::RegisterBenchmark("ScanAndAllocate", ScanAndAllocate);
+    });
 }

@@ -363,25 +363,16 @@ private:
 }  // namespace
 
 int main(int argc, char** argv) {
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
-        return 1;
-    }
-    Client client;
-    TheClient = &client;
-    for (const std::int64_t count : kNameSizes) {
-        benchmark::RegisterBenchmark("UnpackSystemNameList", UnpackNames)->Arg(count);
-        benchmark::RegisterBenchmark("ScanNamesOnly", ScanNamesOnly)->Arg(count);
-        benchmark::RegisterBenchmark("ScanAndAllocateNames", ScanAndAllocateNames)->Arg(count);
-    }
-    for (const std::int64_t count : kDeviceSizes) {
-        benchmark::RegisterBenchmark("UnpackStorageDevices2", UnpackDevices)->Arg(count);
-        benchmark::RegisterBenchmark("ScanDevicesOnly", ScanDevicesOnly)->Arg(count);
-        benchmark::RegisterBenchmark("ScanAndAllocateDevices", ScanAndAllocateDevices)->Arg(count);
-    }
-    RatioReporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
-    benchmark::Shutdown();
-    TheClient = nullptr;
-    return 0;
+    return tav::bench::RunWithClient<Client, RatioReporter>(argc, argv, TheClient, [](Client&) {
+        for (const std::int64_t count : kNameSizes) {
+            benchmark::RegisterBenchmark("UnpackSystemNameList", UnpackNames)->Arg(count);
+            benchmark::RegisterBenchmark("ScanNamesOnly", ScanNamesOnly)->Arg(count);
+            benchmark::RegisterBenchmark("ScanAndAllocateNames", ScanAndAllocateNames)->Arg(count);
+        }
+        for (const std::int64_t count : kDeviceSizes) {
+            benchmark::RegisterBenchmark("UnpackStorageDevices2", UnpackDevices)->Arg(count);
+            benchmark::RegisterBenchmark("ScanDevicesOnly", ScanDevicesOnly)->Arg(count);
+            benchmark::RegisterBenchmark("ScanAndAllocateDevices", ScanAndAllocateDevices)->Arg(count);
+        }
+    });
 }

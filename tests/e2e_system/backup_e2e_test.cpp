@@ -38,7 +38,7 @@ TEST_F(BackupE2eTest, BackupWritesTheSystemAndTellsItsEnd) {
     SinkRef sink;
     ULONG cookie = 0;
     ASSERT_EQ(Subscribe(sink.sink, BackupEvents, &cookie), S_OK);
-    sim::jobs::SetDuration(*Model(), sim::jobs::Job::Backup, 300ms);
+    sim::jobs::SetDuration(*Model(), sim::jobs::Job::Backup, kLongJob);
 
     ASSERT_EQ(Backups()->Backup(nullptr, Wide("CTRL:/hd0a/backups/b1").Get()), S_OK) << LastError();
     TavBackupState state = BackupState_None;

@@ -109,7 +109,7 @@ TEST_F(FilesE2eTest, DiagnosticsFileIsWrittenWithItsEvents) {
     SinkRef sink;
     ULONG cookie = 0;
     ASSERT_EQ(Subscribe(sink.sink, SystemDiagnosticsInfoEvent, &cookie), S_OK);
-    sim::jobs::SetDuration(*Model(), sim::jobs::Job::Diagnostics, 200ms);
+    sim::jobs::SetDuration(*Model(), sim::jobs::Job::Diagnostics, kLongJob);
     auto diagnostics = As<ITavSystemDiagnostics>();
     ASSERT_EQ(diagnostics->SaveDiagnosticsInfo(nullptr, Wide("ctrl:/hd0a/diagnostics/d1.txt").Get()), S_OK);
     EXPECT_EQ(Status(true), static_cast<HRESULT>(0x8000000A)) << "pending";

@@ -66,7 +66,7 @@ TEST_F(InboxE2eTest, DeploymentPackageIsInstalledThroughTheInbox) {
     EXPECT_EQ(Boot()->GetVersion(nullptr, TavInboxFileType_CtrlProdSetting, version.Receive()), sim::kStatusNotFound);
 
     EXPECT_EQ(Operate(TavInboxOperation_ApplyUpdate), sim::kStatusNotAllowed) << "not checked yet";
-    sim::jobs::SetDuration(*Model(), sim::jobs::Job::Inbox, 200ms);
+    sim::jobs::SetDuration(*Model(), sim::jobs::Job::Inbox, kLongJob);
     ASSERT_EQ(Operate(TavInboxOperation_PreCheck), S_OK);
     EXPECT_TRUE(Busy());
     EXPECT_EQ(Operate(TavInboxOperation_Clear), sim::kStatusNotAllowed) << "busy";

@@ -47,8 +47,12 @@ protected:
         });
     }
 
+    // Long enough that a test sees a job still running however loaded the
+    // machine (sanitizers, qemu, Wine), short enough to wait for.
+    static constexpr std::chrono::milliseconds kLongJob = 2500ms;
+
     template <typename F>
-    static bool WaitUntil(F done, std::chrono::milliseconds limit = 5s) {
+    static bool WaitUntil(F done, std::chrono::milliseconds limit = 20s) {
         const auto end = std::chrono::steady_clock::now() + limit;
         while (!done()) {
             if (std::chrono::steady_clock::now() > end) {
