@@ -227,7 +227,12 @@ constexpr VerbSpec kSafety[] = {
     {"unvalidate", "", "mark the configuration not validated (SetSafetyConfigurationNotValidated)", Unvalidate},
     {"lock", "BY", "lock the configuration (SetSafetyConfigurationLocked)", Lock},
     {"unlock", "", "unlock the configuration (SetSafetyConfigurationUnLocked)", Unlock},
-    {"load", "FILE", "load a configuration file (LoadSafetyConfigurationFile)", Load},
+    {"load", "FILE", "load a configuration file (LoadSafetyConfigurationFile)", Load,
+     "FILE: a local file, copied to the controller first, or a ctrl: path. The\n"
+     "virtual controller reads key=value lines: name=, version=MAJOR.MINOR,\n"
+     "createdby=, created= (required), toolposition=, toolspeed=, axisrange=\n"
+     "(instances 1 to 8, comma-separated). A loaded file is in force after\n"
+     "'safety reconfigure'.\n"},
     {"reconfigure", "", "reconfigure the safety controller (Reconfigure)", Reconfigure},
     {"sync", "DRIVE_MODULE", "synchronise a drive module's software (SyncSoftware)", Sync},
     {"factory-reset", "", "reset to the factory defaults (ResetSafetyControllerToFactoryDefault)", FactoryReset},
