@@ -106,8 +106,9 @@ RegistryKey* ReadKeyLine(std::string_view path, RegistryTree& tree) {
         path.remove_prefix(separator + 1);
         separator = path.find('\\');
         std::u16string name;
+        // Windows allows no backslash in a key name; an escaped one would split the key when written back.
         if (depth > kDeepestKey || !Unescape(path.substr(0, separator), name) || name.empty() ||
-            name.size() > kLongestKeyName) {
+            name.size() > kLongestKeyName || name.find(u'\\') != std::u16string::npos) {
             return nullptr;
         }
         bool created;
