@@ -17,6 +17,9 @@ namespace tav::sim {
 namespace {
 
 constexpr TextView kComponent = OLESTR("TavComCtrl.");
+// A controller takes only so many asynchronous requests from one client
+// ahead of their replies; more are refused rather than queued without end.
+constexpr std::size_t kMostWaitingRequests = 256;
 
 TextView ViewOf(BSTR text) { return text == nullptr ? TextView() : TextView(text, SysStringLen(text)); }
 
@@ -217,7 +220,7 @@ HRESULT CommandComponent::Carry(TavInParams* rip, TavCommandReply* reply, TextVi
         return Fail(E_NOINTERFACE, where() + OLESTR(": the callback is no ITavCommandCallback"));
     }
     const ULONG userDef = rip->userDef;
-    const bool posted = replies_.Post([controller, callback, userDef, timeOut, caller = request.caller,
+    const auto posted = replies_.PostUnlessFull([controller, callback, userDef, timeOut, caller = request.caller,
                                        verbText = Text(request.verb),
                                        nameText = Text(request.name), argsText = Text(request.args),
                                        urlText = Text(request.url)](const TaskQueue::Context& context) {
@@ -234,8 +237,12 @@ HRESULT CommandComponent::Carry(TavInParams* rip, TavCommandReply* reply, TextVi
             }
             return S_OK;
         });
-    });
-    if (!posted) {
+    }, kMostWaitingRequests);
+    if (posted == TaskQueue::Posted::Full) {
+        return Fail(kStatusBusy, where() + OLESTR(": ") + Decimal(kMostWaitingRequests) +
+                                     OLESTR(" asynchronous requests are waiting for the controller already"));
+    }
+    if (posted == TaskQueue::Posted::Stopping) {
         return Fail(E_UNEXPECTED, where() + OLESTR(": the component is shutting down"));
     }
     return S_OK;

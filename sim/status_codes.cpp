@@ -11,6 +11,7 @@ const char* StatusName(HRESULT status) {
         case kStatusTimedOut: return "SIM_TIMED_OUT";
         case kStatusLinkDown: return "SIM_LINK_DOWN";
         case kStatusSimulatedFailure: return "SIM_SIMULATED_FAILURE";
+        case kStatusBusy: return "SIM_BUSY";
         default: return nullptr;
     }
 }

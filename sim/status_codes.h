@@ -14,6 +14,7 @@ inline constexpr HRESULT kStatusNotFound = static_cast<HRESULT>(0xC0049004u);
 inline constexpr HRESULT kStatusTimedOut = static_cast<HRESULT>(0xC0049005u);
 inline constexpr HRESULT kStatusLinkDown = static_cast<HRESULT>(0xC0049006u);
 inline constexpr HRESULT kStatusSimulatedFailure = static_cast<HRESULT>(0xC0049007u);
+inline constexpr HRESULT kStatusBusy = static_cast<HRESULT>(0xC0049008u);
 
 // The symbolic name of one of the codes above, or nullptr.
 const char* StatusName(HRESULT status);

@@ -37,17 +37,24 @@ TaskQueue::TaskQueue() : state_(std::make_shared<Context::State>()) {}
 TaskQueue::~TaskQueue() { Stop(); }
 
 bool TaskQueue::Post(Task task) {
+    return PostUnlessFull(std::move(task), static_cast<std::size_t>(-1)) == Posted::Yes;
+}
+
+TaskQueue::Posted TaskQueue::PostUnlessFull(Task task, std::size_t limit) {
     {
         std::lock_guard lock(state_->mutex);
         if (state_->stopping) {
-            return false;  // before threadMutex_, which a stopping queue holds while it joins
+            return Posted::Stopping;  // before threadMutex_, which a stopping queue holds while it joins
         }
     }
     std::lock_guard threadLock(threadMutex_);
     {
         std::lock_guard lock(state_->mutex);
         if (state_->stopping) {
-            return false;
+            return Posted::Stopping;
+        }
+        if (state_->tasks.size() >= limit) {
+            return Posted::Full;
         }
         state_->tasks.push_back(std::move(task));
     }
@@ -55,7 +62,7 @@ bool TaskQueue::Post(Task task) {
     if (!thread_.joinable()) {
         thread_ = std::thread([state = state_] { state->Run(state); });
     }
-    return true;
+    return Posted::Yes;
 }
 
 void TaskQueue::Stop() {

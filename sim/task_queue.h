@@ -1,5 +1,6 @@
 #pragma once
 #include <chrono>
+#include <cstddef>
 #include <condition_variable>
 #include <deque>
 #include <functional>
@@ -35,6 +36,10 @@ public:
 
     // False once stopped.
     bool Post(Task task);
+
+    // Post, unless `limit` tasks are already waiting.
+    enum class Posted { Yes, Full, Stopping };
+    Posted PostUnlessFull(Task task, std::size_t limit);
 
     // May be called from a task: the thread then finishes on its own.
     void Stop();

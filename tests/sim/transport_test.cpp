@@ -134,6 +134,24 @@ TEST_F(TransportTest, GarbledCommandAnswersHalfItsReplyAndAMark) {
     EXPECT_EQ("-Name \"kept\"", Get("CtrlName").text);
 }
 
+TEST_F(TransportTest, AsynchronousRequestsPastTheLimitAreRefusedNotQueued) {
+    controller_->Faults().SetDelay(T("State"), 10s);  // the first one holds the worker
+    Ref<ReplyCollector> callback(new ReplyCollector);
+    TavInParams async = AsyncParams(callback.get(), 1);
+    int accepted = 0;
+    for (int i = 0; i < 300; ++i) {
+        const Outcome outcome = Execute("Get", "State", "", &async);
+        if (outcome.hr == S_OK) {
+            ++accepted;
+        } else {
+            EXPECT_EQ(kStatusBusy, outcome.hr);
+            EXPECT_NE(std::string::npos, ErrorTextOf(command_.Get()).find("256 asynchronous requests are waiting"));
+        }
+    }
+    EXPECT_GE(accepted, 256);
+    EXPECT_LE(accepted, 257);
+}
+
 TEST_F(TransportTest, BadCallsFailExecuteAndLeaveAText) {
     const Bstr verb = B("Get");
     const Bstr command = B("State");
