@@ -9,25 +9,12 @@
 #include <cstdio>
 #include <cstdlib>
 
+#include "fuzz_text.h"
 #include "sim/arguments.h"
 #include "sim/command_runner.h"
 
 namespace tav::sim {
 namespace {
-
-Text Characters(const std::uint8_t* data, std::size_t size) {
-    Text text;
-    text.reserve(size);
-    for (std::size_t i = 0; i < size; ++i) {
-        if (data[i] == 0xFF && i + 2 < size) {
-            text.push_back(static_cast<OLECHAR>(data[i + 1] << 8 | data[i + 2]));
-            i += 2;
-        } else {
-            text.push_back(static_cast<OLECHAR>(data[i]));
-        }
-    }
-    return text;
-}
 
 [[noreturn]] void Fault(const char* what) {
     std::fprintf(stderr, "%s\n", what);
@@ -61,7 +48,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     static ControllerModel* const controller = new ControllerModel(OLESTR("/fuzz"));
     if (size == 0) return 0;
     const std::uint8_t flags = data[0];
-    const Text text = Characters(data + 1, size - 1);
+    const Text text = tav::fuzz::OleTextOf(data + 1, size - 1);
     const std::size_t split = text.find(OLECHAR('\n'));
     const TextView name = TextView(text).substr(0, split);
     const TextView args = split == Text::npos ? TextView() : TextView(text).substr(split + 1);

@@ -10,26 +10,13 @@
 #include <string>
 #include <string_view>
 
+#include "fuzz_text.h"
 #include "tav/bstr.h"
 #include "tav/com_ptr.h"
 #include "unpack/decoder_table.h"
 
 namespace tav::fuzz {
 namespace {
-
-std::basic_string<OLECHAR> ReplyText(const std::uint8_t* data, std::size_t size) {
-    std::basic_string<OLECHAR> text;
-    text.reserve(size);
-    for (std::size_t i = 0; i < size; ++i) {
-        if (data[i] == 0xFF && i + 2 < size) {
-            text.push_back(static_cast<OLECHAR>(data[i + 1] << 8 | data[i + 2]));
-            i += 2;
-        } else {
-            text.push_back(static_cast<OLECHAR>(data[i]));
-        }
-    }
-    return text;
-}
 
 // What a callback may hand a client instead of a reply text.
 void OtherVariant(const std::uint8_t* data, std::size_t size, VARIANT& reply, BSTR& byReference) {
@@ -102,7 +89,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     VariantInit(&reply);
     BSTR byReference = nullptr;
     if (text) {
-        const auto chars = ReplyText(data, size);
+        const auto chars = OleTextOf(data, size);
         reply.vt = VT_BSTR;
         // Exactly as long as the text, so that a read past it is seen.
         reply.bstrVal = SysAllocStringLen(chars.data(), static_cast<UINT>(chars.size()));

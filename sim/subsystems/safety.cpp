@@ -378,24 +378,34 @@ Reply GetInfo(ControllerModel& controller, const Command&) {
     });
 }
 
-Reply SetValidated(ControllerModel& controller, const Command& command) {
-    constexpr TextView kCommand = OLESTR("SafetyConfValidated");
+// A change to the configuration in force that records who made it: the name
+// is checked first, then what any change needs, then `change` itself.
+template <typename Change>
+Reply ChangeByName(ControllerModel& controller, const Command& command, TextView commandName, Change change) {
     const auto name = NameArgument(command);
     if (!name) {
-        return Refused(kCommand, kStatusBadArgument,
+        return Refused(commandName, kStatusBadArgument,
                        OLESTR("expected -Name \"<1 to 63 characters>\", got ") + Quoted(command.args));
     }
     return controller.Update([&](ModelState& state, EventPosts&) -> Reply {
         SafetyState& safety = state.Part<SafetyState>();
-        if (auto refusal = NotChangeable(kCommand, safety)) return std::move(*refusal);
-        if (safety.inForce->locked) {
+        if (auto refusal = NotChangeable(commandName, safety)) return std::move(*refusal);
+        return change(safety, *safety.inForce, *name, DateText(ControllerModel::Now(state)));
+    });
+}
+
+Reply SetValidated(ControllerModel& controller, const Command& command) {
+    constexpr TextView kCommand = OLESTR("SafetyConfValidated");
+    const auto validate = [&](SafetyState&, Configuration& c, const Text& name, Text date) -> Reply {
+        if (c.locked) {
             return Refused(kCommand, kStatusNotAllowed, OLESTR("the configuration is locked"));
         }
-        safety.inForce->validated = true;
-        safety.inForce->validatedBy = *name;
-        safety.inForce->validationDate = DateText(ControllerModel::Now(state));
+        c.validated = true;
+        c.validatedBy = name;
+        c.validationDate = std::move(date);
         return Done();
-    });
+    };
+    return ChangeByName(controller, command, kCommand, validate);
 }
 
 Reply SetNotValidated(ControllerModel& controller, const Command&) {
@@ -522,15 +532,7 @@ Reply LoadFile(ControllerModel& controller, const Command& command) {
 
 Reply Lock(ControllerModel& controller, const Command& command) {
     constexpr TextView kCommand = OLESTR("LockSupervConfig");
-    const auto name = NameArgument(command);
-    if (!name) {
-        return Refused(kCommand, kStatusBadArgument,
-                       OLESTR("expected -Name \"<1 to 63 characters>\", got ") + Quoted(command.args));
-    }
-    return controller.Update([&](ModelState& state, EventPosts&) -> Reply {
-        SafetyState& safety = state.Part<SafetyState>();
-        if (auto refusal = NotChangeable(kCommand, safety)) return std::move(*refusal);
-        Configuration& c = *safety.inForce;
+    const auto lock = [&](SafetyState& safety, Configuration& c, const Text& name, Text date) -> Reply {
         if (c.locked) {
             return Refused(kCommand, kStatusNotAllowed, OLESTR("the configuration is locked already"));
         }
@@ -543,10 +545,11 @@ Reply Lock(ControllerModel& controller, const Command& command) {
                                OLESTR(" mode; a configuration is locked in active mode"));
         }
         c.locked = true;
-        c.lockedBy = *name;
-        c.lockDate = DateText(ControllerModel::Now(state));
+        c.lockedBy = name;
+        c.lockDate = std::move(date);
         return Done();
-    });
+    };
+    return ChangeByName(controller, command, kCommand, lock);
 }
 
 Reply Unlock(ControllerModel& controller, const Command&) {
