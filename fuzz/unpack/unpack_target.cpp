@@ -44,16 +44,16 @@ void OtherVariant(const std::uint8_t* data, std::size_t size, VARIANT& reply, BS
     }
 }
 
-bool EndsWithSuffix(std::u16string_view text) {
+bool EndsWithSuffix(OleStringView text) {
     // "...TavControllerImpl[<line>]; "
-    constexpr std::u16string_view source = u"TavControllerImpl[";
-    if (text.size() < source.size() + 4 || text.substr(text.size() - 3) != u"]; ") return false;
+    const OleStringView source = OLESTR("TavControllerImpl[");
+    if (text.size() < source.size() + 4 || text.substr(text.size() - 3) != OLESTR("]; ")) return false;
     const std::size_t open = text.rfind(source);
-    if (open == std::u16string_view::npos) return false;
-    const std::u16string_view line = text.substr(open + source.size(), text.size() - 3 - open - source.size());
+    if (open == OleStringView::npos) return false;
+    const OleStringView line = text.substr(open + source.size(), text.size() - 3 - open - source.size());
     if (line.empty()) return false;
-    for (char16_t c : line) {
-        if (c < u'0' || c > u'9') return false;
+    for (const OLECHAR c : line) {
+        if (c < OLECHAR('0') || c > OLECHAR('9')) return false;
     }
     return true;
 }
@@ -67,7 +67,7 @@ void CheckErrorText(const DecoderRow& row, HRESULT hr) {
     ComPtr<ITavHelperBase> helper;
     if (FAILED(QueryTo(DecodingObject(), helper))) std::abort();
     Bstr text;
-    if (FAILED(helper->GetLastErrorInfo(text.Receive())) || !EndsWithSuffix(std::u16string_view(text.View()))) {
+    if (FAILED(helper->GetLastErrorInfo(text.Receive())) || !EndsWithSuffix(text.View())) {
         std::fprintf(stderr, "%s failed without an error text that names its site\n", row.name);
         std::abort();
     }

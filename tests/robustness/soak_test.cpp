@@ -141,9 +141,9 @@ bool KnownFailure(HRESULT hr) {
     }
 }
 
-bool NamesItsSite(const std::u16string& text) {
-    const std::size_t open = text.rfind(u"TavControllerImpl[");
-    return open != std::u16string::npos && text.size() >= 3 && text.compare(text.size() - 3, 3, u"]; ") == 0;
+bool NamesItsSite(OleStringView text) {
+    const std::size_t open = text.rfind(OLESTR("TavControllerImpl["));
+    return open != OleStringView::npos && text.size() >= 3 && text.compare(text.size() - 3, 3, OLESTR("]; ")) == 0;
 }
 
 // One operation of one subsystem, called on a controller; nonzero call types
@@ -345,7 +345,7 @@ TEST_F(SoakTest, SixteenThreadsOfMixedOperationsWhileFaultsFlip) {
                 ComPtr<ITavHelperBase> helper;
                 Bstr text;
                 if (SUCCEEDED(target.As(helper)) && SUCCEEDED(helper->GetLastErrorInfo(text.Receive())) &&
-                    !NamesItsSite(std::u16string(text.View()))) {
+                    !NamesItsSite(text.View())) {
                     if (unsited++ < 5) ADD_FAILURE() << "operation " << which << ": " << text::Narrow(text.View());
                 }
             }
