@@ -147,17 +147,17 @@ concept HasCheck = requires(const A& adapter, Reply& reply, const Value& value) 
 };
 
 // Where field I of the format is scanned to, for its adapter A.
-template <text::FieldSpec Spec, class A>
+template <text::FieldShape Shape, class A>
 struct Storage;
 
-template <text::FieldSpec Spec, class A>
-    requires(Spec.kind == text::FieldKind::Chars)
-struct Storage<Spec, A> {
-    static_assert(Spec.width > 0 || HasRoom<A>,
+template <text::FieldShape Shape, class A>
+    requires(Shape.kind == text::FieldKind::Chars)
+struct Storage<Shape, A> {
+    static_assert(Shape.width > 0 || HasRoom<A>,
                   "a string field without a width needs an out-value that bounds it (fields::Bounded<N>)");
     // Read in place: a field without a width is bounded by its out-value's room.
     static constexpr std::size_t kRoom = [] {
-        if constexpr (Spec.width > 0) {
+        if constexpr (Shape.width > 0) {
             return std::size_t{0};
         } else {
             return A::kRoom;
@@ -168,26 +168,26 @@ struct Storage<Spec, A> {
     OleStringView Value() const { return value; }
 };
 
-template <text::FieldSpec Spec, class A>
-    requires(Spec.kind == text::FieldKind::Signed || Spec.kind == text::FieldKind::Unsigned ||
-             Spec.kind == text::FieldKind::Count)
-struct Storage<Spec, A> {
+template <text::FieldShape Shape, class A>
+    requires(Shape.kind == text::FieldKind::Signed || Shape.kind == text::FieldKind::Unsigned ||
+             Shape.kind == text::FieldKind::Count)
+struct Storage<Shape, A> {
     std::uint32_t value;
     std::uint32_t* Target() { return &value; }
     std::uint32_t Value() const { return value; }
 };
 
-template <text::FieldSpec Spec, class A>
-    requires(Spec.kind == text::FieldKind::Double)
-struct Storage<Spec, A> {
+template <text::FieldShape Shape, class A>
+    requires(Shape.kind == text::FieldKind::Double)
+struct Storage<Shape, A> {
     double value;
     double* Target() { return &value; }
     double Value() const { return value; }
 };
 
-template <text::FieldSpec Spec, class A>
-    requires(Spec.kind == text::FieldKind::Char)
-struct Storage<Spec, A> {
+template <text::FieldShape Shape, class A>
+    requires(Shape.kind == text::FieldKind::Char)
+struct Storage<Shape, A> {
     OLECHAR value;
     OLECHAR* Target() { return &value; }
     OLECHAR Value() const { return value; }
@@ -215,7 +215,7 @@ S& Get(Slot<I, S>& slot) {
 template <text::ScanFormat F>
 constexpr int CountedFields() {
     int n = 0;
-    for (const text::FieldSpec& field : text::kScanFields<F>) {
+    for (const text::FieldShape& field : text::kScanFields<F>) {
         n += field.kind == text::FieldKind::Count ? 0 : 1;
     }
     return n;

@@ -41,7 +41,7 @@ enum class FieldKind : std::uint8_t {
     Count,     // %n: characters consumed so far, not counted in the result
 };
 
-struct FieldSpec {
+struct FieldShape {
     FieldKind kind;
     std::size_t width;
 };
@@ -202,8 +202,8 @@ struct Compiled {
         }
         return n;
     }();
-    static constexpr std::array<FieldSpec, kTargets> kFields = [] {
-        std::array<FieldSpec, kTargets> fields{};
+    static constexpr std::array<FieldShape, kTargets> kFields = [] {
+        std::array<FieldShape, kTargets> fields{};
         std::size_t n = 0;
         for (const Op& op : kOps) {
             if (!op.store) {
@@ -219,7 +219,7 @@ struct Compiled {
             case OpKind::Set: kind = FieldKind::Chars; break;
             default: break;
             }
-            fields[n++] = FieldSpec{kind, op.width};
+            fields[n++] = FieldShape{kind, op.width};
         }
         return fields;
     }();

@@ -14,12 +14,12 @@ namespace {
 
 TEST(HelpTest, EveryGroupAndVerbHasHelp) {
     std::set<std::string> groups;
-    for (const GroupSpec& group : Groups()) {
+    for (const GroupEntry& group : Groups()) {
         EXPECT_TRUE(groups.insert(group.name).second) << "two groups named " << group.name;
         const auto groupHelp = HelpFor({group.name, "--help"});
         ASSERT_TRUE(groupHelp) << group.name;
         std::set<std::string> verbs;
-        for (const VerbSpec& verb : group.verbs) {
+        for (const VerbEntry& verb : group.verbs) {
             EXPECT_TRUE(verbs.insert(verb.name).second) << group.name << " has two verbs " << verb.name;
             EXPECT_NE(std::string::npos, groupHelp->find(VerbUsage(group, verb))) << *groupHelp;
             if (*verb.name == '\0') {
@@ -36,8 +36,8 @@ TEST(HelpTest, EveryGroupAndVerbHasHelp) {
 }
 
 // A verb of no group, for reading arguments without a controller.
-constexpr VerbSpec kVerb = {"set", "VALUE", "test", nullptr};
-constexpr GroupSpec kGroup = {"test", "test", {}};
+constexpr VerbEntry kVerb = {"set", "VALUE", "test", nullptr};
+constexpr GroupEntry kGroup = {"test", "test", {}};
 
 class ArgumentTest : public ::testing::Test {
 protected:

@@ -95,7 +95,7 @@ constexpr const char* kRestoreDetails =
     "settings to include (the ...3 operations of ITavBackupRestore2). Prints the\n"
     "controller's error information, empty when there is none.\n";
 
-constexpr VerbSpec kBackup[] = {
+constexpr VerbEntry kBackup[] = {
     {"start", "PATH", "start a backup into a controller folder (Backup)", Start},
     {"state", "", "print whether a backup runs (GetBackupState)", State},
     {"check", "PATH [--include I] [--ignore M] [--settings N]", "check that a backup can be restored (CheckRestore)",
@@ -107,10 +107,10 @@ constexpr VerbSpec kBackup[] = {
     {"decompress", "FILE DESTINATION", "decompress a file on the controller (Decompress)", Decompress},
 };
 
-constexpr GroupSpec kGroups[] = {{"backup", "Backup and restore", kBackup}};
+constexpr GroupEntry kGroups[] = {{"backup", "Backup and restore", kBackup}};
 
 }  // namespace
 
-std::span<const GroupSpec> BackupGroups() { return kGroups; }
+std::span<const GroupEntry> BackupGroups() { return kGroups; }
 
 }  // namespace tavctl

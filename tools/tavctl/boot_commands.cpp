@@ -139,7 +139,7 @@ int InboxUpgrade(Verb& v) {
     return v.Set("UpgradeBootServer", &Boot3::UpgradeBootServer, folder.Get());
 }
 
-constexpr VerbSpec kSystem[] = {
+constexpr VerbEntry kSystem[] = {
     {"list", "[--sort MODE] [--filter MODE]", "list the installed systems (GetSystemNameList)", SystemList,
      "--sort and --filter hand MODE (a number) to the enumerator's Sort and Filter\n"
      "before the names are read, so the list shows what the enumerator hands out.\n"},
@@ -152,13 +152,13 @@ constexpr VerbSpec kSystem[] = {
     {"install2", "CTRLID CTRLNAME SYSDEF PKGROOT", "install a system from a deployment package (InstallNewSystem2)",
      SystemInstall2},
 };
-constexpr VerbSpec kBoot[] = {
+constexpr VerbEntry kBoot[] = {
     {"device", "[DEVICE]", "print the boot device (GetBootDevice), or set it (SetBootDevice)", BootDevice},
     {"spanned", "", "print the number of spanned files (GetNoOfSpannedFiles)", BootSpanned},
     {"load", "", "load the boot image; prints whether it is done (LoadBootImage)", BootLoad},
     {"undo", "", "undo loading the boot image (UndoLoadBootImage)", BootUndo},
 };
-constexpr VerbSpec kInbox[] = {
+constexpr VerbEntry kInbox[] = {
     {"state", "", "print the inbox state (GetSysInboxState)", InboxState},
     {"busy", "", "print whether the inbox is busy (IsInboxBusy)", InboxBusy},
     {"path", "", "print the inbox folder (GetInboxPath)", InboxPath},
@@ -174,7 +174,7 @@ constexpr VerbSpec kInbox[] = {
     {"upgrade", "FOLDER", "upgrade the boot server (UpgradeBootServer)", InboxUpgrade},
 };
 
-constexpr GroupSpec kGroups[] = {
+constexpr GroupEntry kGroups[] = {
     {"system", "Installed controller systems", kSystem},
     {"boot", "The boot device and image", kBoot},
     {"inbox", "The installation inbox", kInbox},
@@ -182,6 +182,6 @@ constexpr GroupSpec kGroups[] = {
 
 }  // namespace
 
-std::span<const GroupSpec> BootGroups() { return kGroups; }
+std::span<const GroupEntry> BootGroups() { return kGroups; }
 
 }  // namespace tavctl

@@ -50,25 +50,25 @@ int Restart(Verb& v) {
     return v.Set("Restart", &ITavController::Restart, mode);
 }
 
-constexpr VerbSpec kClock[] = {
+constexpr VerbEntry kClock[] = {
     {"get", "", "print the controller clock (GetSystemClock)", ClockGet},
     {"set", "TIME", "set the controller clock (SetSystemClock)", ClockSet,
      "TIME is ISO-8601 UTC to the second, e.g. 2026-11-21T02:30:00Z, or now.\n"},
     {"startup", "", "print when the controller started (GetSystemStartupClock)", ClockStartup},
 };
-constexpr VerbSpec kRestart[] = {
+constexpr VerbEntry kRestart[] = {
     {"", "MODE", "restart the controller (Restart)", Restart,
      "MODE: WarmStart ColdStart PStart IStart XStart SStart BStart (or warm cold\n"
      "p i x s b); a number is passed on as it is.\n"},
 };
 
-constexpr GroupSpec kGroups[] = {
+constexpr GroupEntry kGroups[] = {
     {"clock", "The controller clock, in UTC", kClock},
     {"restart", "Restarting the controller", kRestart},
 };
 
 }  // namespace
 
-std::span<const GroupSpec> ClockGroups() { return kGroups; }
+std::span<const GroupEntry> ClockGroups() { return kGroups; }
 
 }  // namespace tavctl

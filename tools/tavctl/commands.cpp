@@ -11,8 +11,8 @@ namespace {
 
 bool IsHelp(const std::string& word) { return word == "--help" || word == "-h"; }
 
-const VerbSpec* FindVerb(const GroupSpec& group, const std::string& name) {
-    for (const VerbSpec& verb : group.verbs) {
+const VerbEntry* FindVerb(const GroupEntry& group, const std::string& name) {
+    for (const VerbEntry& verb : group.verbs) {
         if (*verb.name != '\0' && name == verb.name) {
             return &verb;
         }
@@ -20,8 +20,8 @@ const VerbSpec* FindVerb(const GroupSpec& group, const std::string& name) {
     return nullptr;
 }
 
-const VerbSpec* BareVerb(const GroupSpec& group) {
-    for (const VerbSpec& verb : group.verbs) {
+const VerbEntry* BareVerb(const GroupEntry& group) {
+    for (const VerbEntry& verb : group.verbs) {
         if (*verb.name == '\0') {
             return &verb;
         }
@@ -29,9 +29,9 @@ const VerbSpec* BareVerb(const GroupSpec& group) {
     return nullptr;
 }
 
-std::string VerbList(const GroupSpec& group) {
+std::string VerbList(const GroupEntry& group) {
     std::string list;
-    for (const VerbSpec& verb : group.verbs) {
+    for (const VerbEntry& verb : group.verbs) {
         if (*verb.name != '\0') {
             list += (list.empty() ? "" : ", ") + std::string(verb.name);
         }
@@ -41,9 +41,9 @@ std::string VerbList(const GroupSpec& group) {
 
 }  // namespace
 
-std::span<const GroupSpec> Groups() {
-    static const std::vector<GroupSpec> all = [] {
-        std::vector<GroupSpec> groups;
+std::span<const GroupEntry> Groups() {
+    static const std::vector<GroupEntry> all = [] {
+        std::vector<GroupEntry> groups;
         for (const auto list : {IdentityGroups(), ClockGroups(), PanelGroups(), EventGroups(), VirtualTimeGroups(),
                                 IpcGroups(), BackupGroups(), BootGroups(), DeviceGroups(), NetworkGroups(),
                                 VisionGroups(), TimeGroups(), SafetyGroups(), UserGroups()}) {
@@ -54,8 +54,8 @@ std::span<const GroupSpec> Groups() {
     return all;
 }
 
-const GroupSpec* FindGroup(const std::string& name) {
-    for (const GroupSpec& group : Groups()) {
+const GroupEntry* FindGroup(const std::string& name) {
+    for (const GroupEntry& group : Groups()) {
         if (name == group.name) {
             return &group;
         }
@@ -63,7 +63,7 @@ const GroupSpec* FindGroup(const std::string& name) {
     return nullptr;
 }
 
-std::string VerbUsage(const GroupSpec& group, const VerbSpec& verb) {
+std::string VerbUsage(const GroupEntry& group, const VerbEntry& verb) {
     std::string line = "tavctl " + std::string(group.name);
     if (*verb.name != '\0') {
         line += " " + std::string(verb.name);
@@ -74,13 +74,13 @@ std::string VerbUsage(const GroupSpec& group, const VerbSpec& verb) {
     return line;
 }
 
-std::string GroupHelp(const GroupSpec& group) {
+std::string GroupHelp(const GroupEntry& group) {
     std::string help = "Usage:";
-    for (const VerbSpec& verb : group.verbs) {
+    for (const VerbEntry& verb : group.verbs) {
         help += (help == "Usage:" ? " " : "       ") + VerbUsage(group, verb) + "\n";
     }
     help += std::string(group.summary) + ".\n\nVerbs:\n";
-    for (const VerbSpec& verb : group.verbs) {
+    for (const VerbEntry& verb : group.verbs) {
         const std::string name = *verb.name == '\0' ? "(none)" : verb.name;
         help += "  " + name + std::string(name.size() < 15 ? 15 - name.size() : 1, ' ') + verb.summary + "\n";
     }
@@ -88,7 +88,7 @@ std::string GroupHelp(const GroupSpec& group) {
     return help;
 }
 
-std::string VerbHelp(const GroupSpec& group, const VerbSpec& verb) {
+std::string VerbHelp(const GroupEntry& group, const VerbEntry& verb) {
     std::string help = "Usage: " + VerbUsage(group, verb) + "\n" + verb.summary + ".\n";
     if (verb.details != nullptr) {
         help += verb.details;
@@ -107,12 +107,12 @@ std::optional<std::string> HelpFor(const std::vector<std::string>& words) {
     if (first >= words.size() || IsHelp(words[first])) {
         return std::nullopt;
     }
-    const GroupSpec* group = FindGroup(words[first]);
+    const GroupEntry* group = FindGroup(words[first]);
     if (group == nullptr) {
         return std::nullopt;
     }
     if (first + 1 < words.size()) {
-        if (const VerbSpec* verb = FindVerb(*group, words[first + 1])) {
+        if (const VerbEntry* verb = FindVerb(*group, words[first + 1])) {
             return VerbHelp(*group, *verb);
         }
     }
@@ -154,7 +154,7 @@ int RunCommand(Session& session, std::vector<std::string> words) {
         session.Error("no command given\n(tavctl --help lists the groups)");
         return kExitUsage;
     }
-    const GroupSpec* group = FindGroup(words.front());
+    const GroupEntry* group = FindGroup(words.front());
     if (group == nullptr) {
         session.Error("unknown group " + Quote(words.front()) + "\n(tavctl --help lists the groups)");
         return kExitUsage;
@@ -163,7 +163,7 @@ int RunCommand(Session& session, std::vector<std::string> words) {
         session.Print(*help);
         return kExitOk;
     }
-    const VerbSpec* verb = words.size() > 1 ? FindVerb(*group, words[1]) : nullptr;
+    const VerbEntry* verb = words.size() > 1 ? FindVerb(*group, words[1]) : nullptr;
     std::size_t consumed = 2;
     if (verb == nullptr) {
         verb = BareVerb(*group);

@@ -13,7 +13,7 @@ using VerbFunction = int (*)(Verb& verb);
 
 // One verb of a group: `tavctl GROUP VERB ARGS`. A verb named "" is the
 // group's bare form, run when the next word names no verb of the group.
-struct VerbSpec {
+struct VerbEntry {
     const char* name;
     const char* args;     // the arguments in the usage line
     const char* summary;  // one line
@@ -23,35 +23,35 @@ struct VerbSpec {
 
 // One group of verbs, mostly one subsystem. Adding a verb is one row and
 // one function; adding a group is one entry in its file's list.
-struct GroupSpec {
+struct GroupEntry {
     const char* name;
     const char* summary;
-    std::span<const VerbSpec> verbs;
+    std::span<const VerbEntry> verbs;
 };
 
-std::span<const GroupSpec> IdentityGroups();
-std::span<const GroupSpec> ClockGroups();
-std::span<const GroupSpec> PanelGroups();
-std::span<const GroupSpec> EventGroups();
-std::span<const GroupSpec> VirtualTimeGroups();
-std::span<const GroupSpec> IpcGroups();
-std::span<const GroupSpec> BackupGroups();
-std::span<const GroupSpec> BootGroups();
-std::span<const GroupSpec> DeviceGroups();
-std::span<const GroupSpec> NetworkGroups();
-std::span<const GroupSpec> VisionGroups();
-std::span<const GroupSpec> TimeGroups();
-std::span<const GroupSpec> SafetyGroups();
-std::span<const GroupSpec> UserGroups();
+std::span<const GroupEntry> IdentityGroups();
+std::span<const GroupEntry> ClockGroups();
+std::span<const GroupEntry> PanelGroups();
+std::span<const GroupEntry> EventGroups();
+std::span<const GroupEntry> VirtualTimeGroups();
+std::span<const GroupEntry> IpcGroups();
+std::span<const GroupEntry> BackupGroups();
+std::span<const GroupEntry> BootGroups();
+std::span<const GroupEntry> DeviceGroups();
+std::span<const GroupEntry> NetworkGroups();
+std::span<const GroupEntry> VisionGroups();
+std::span<const GroupEntry> TimeGroups();
+std::span<const GroupEntry> SafetyGroups();
+std::span<const GroupEntry> UserGroups();
 
 // Every group, in the order tavctl --help lists them.
-std::span<const GroupSpec> Groups();
-const GroupSpec* FindGroup(const std::string& name);
+std::span<const GroupEntry> Groups();
+const GroupEntry* FindGroup(const std::string& name);
 
 // "Usage: tavctl GROUP VERB ARGS" lines of one verb, or of every verb.
-std::string VerbUsage(const GroupSpec& group, const VerbSpec& verb);
-std::string GroupHelp(const GroupSpec& group);
-std::string VerbHelp(const GroupSpec& group, const VerbSpec& verb);
+std::string VerbUsage(const GroupEntry& group, const VerbEntry& verb);
+std::string GroupHelp(const GroupEntry& group);
+std::string VerbHelp(const GroupEntry& group, const VerbEntry& verb);
 
 // When the words ask for help (tavctl GROUP --help, GROUP VERB --help), the
 // help text, which needs neither module nor controller; else empty.

@@ -131,26 +131,26 @@ int List(Verb& v) {
     return kExitOk;
 }
 
-constexpr VerbSpec kDevices[] = {
+constexpr VerbEntry kDevices[] = {
     {"", "[--v2]", "list the storage devices (GetStorageDevices, GetStorageDevices2 with --v2)", Devices}};
-constexpr VerbSpec kCopy[] = {
+constexpr VerbEntry kCopy[] = {
     {"file", "SOURCE DESTINATION", "copy a file on the controller (CopyFile)", CopyFile},
     {"dir", "SOURCE DESTINATION", "copy a folder on the controller (CopyDirectory)", CopyDirectory},
 };
-constexpr VerbSpec kDiag[] = {
+constexpr VerbEntry kDiag[] = {
     {"save", "PATH", "save the diagnostics information (SaveDiagnosticsInfo)", DiagSave},
     {"status", "", "print the result of the last save (GetDiagnosticsInfoStatus)", DiagStatus},
 };
-constexpr VerbSpec kScreenDump[] = {
+constexpr VerbEntry kScreenDump[] = {
     {"request", "", "ask the pendant for a screen dump (ReqDorvelScreenDump)", DumpRequest},
     {"status", "", "print the result of the last screen dump (GetDorvelScreenDumpStatus)", DumpStatus},
 };
-constexpr VerbSpec kList[] = {
+constexpr VerbEntry kList[] = {
     {"", "[PATH]", "list a folder of the embedded virtual controller's disks", List,
      "The module has no operation that lists a folder; ls reads the embedded\n"
      "virtual controller's disks (hd0a, usb1, ...) directly.\n"}};
 
-constexpr GroupSpec kGroups[] = {
+constexpr GroupEntry kGroups[] = {
     {"devices", "Storage devices", kDevices},
     {"copy", "Copying files and folders on the controller", kCopy},
     {"diag", "Diagnostics information", kDiag},
@@ -160,6 +160,6 @@ constexpr GroupSpec kGroups[] = {
 
 }  // namespace
 
-std::span<const GroupSpec> DeviceGroups() { return kGroups; }
+std::span<const GroupEntry> DeviceGroups() { return kGroups; }
 
 }  // namespace tavctl

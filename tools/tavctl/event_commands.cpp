@@ -329,7 +329,7 @@ int WatchRun(Verb& v) {
     return status;
 }
 
-constexpr VerbSpec kWatch[] = {
+constexpr VerbEntry kWatch[] = {
     {"", "[--type T1,T2...] [--count N] [--timeout SECONDS]", "print events as they arrive", WatchRun,
      "Subscribes (ITavSubscribe) and prints each event, time-stamped and decoded\n"
      "with its Unpack operation, as it arrives; ends after N events or the time\n"
@@ -346,10 +346,10 @@ constexpr VerbSpec kWatch[] = {
     {"stop", "", "unsubscribe", WatchStop},
 };
 
-constexpr GroupSpec kGroups[] = {{"watch", "Controller events", kWatch}};
+constexpr GroupEntry kGroups[] = {{"watch", "Controller events", kWatch}};
 
 }  // namespace
 
-std::span<const GroupSpec> EventGroups() { return kGroups; }
+std::span<const GroupEntry> EventGroups() { return kGroups; }
 
 }  // namespace tavctl

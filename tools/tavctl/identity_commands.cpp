@@ -100,22 +100,22 @@ int LastError(Verb& v) {
     return kExitOk;
 }
 
-constexpr VerbSpec kName[] = {
+constexpr VerbEntry kName[] = {
     {"get", "", "print the controller's name (GetControllerName)", NameGet},
     {"set", "NAME", "set the controller's name (SetControllerName)", NameSet},
 };
-constexpr VerbSpec kId[] = {
+constexpr VerbEntry kId[] = {
     {"get", "", "print the controller identifier (GetControllerID)", IdGet},
     {"set", "ID", "set the controller identifier (SetControllerId)", IdSet},
 };
-constexpr VerbSpec kLanguage[] = {{"set", "LANGUAGE", "set the controller's language (SetLanguage)", LanguageSet}};
-constexpr VerbSpec kGuid[] = {{"", "", "print the system GUID (GetSystemID)", Guid}};
-constexpr VerbSpec kEnvironment[] = {{"", "NAME", "print a variable (GetEnvironmentVariable)", Environment}};
-constexpr VerbSpec kOption[] = {{"", "OPTION", "tell whether an option is installed (IsOptionPresent)", Option}};
-constexpr VerbSpec kClients[] = {{"", "", "list the connected API clients as XML (GetConnectedTavAPIClients)", Clients}};
-constexpr VerbSpec kEnergy[] = {{"", "", "print the system energy state (GetSysEnergyState)", Energy}};
-constexpr VerbSpec kLink[] = {{"", "", "check the file transfer link (CheckFileTransferLink)", Link}};
-constexpr VerbSpec kVersion[] = {
+constexpr VerbEntry kLanguage[] = {{"set", "LANGUAGE", "set the controller's language (SetLanguage)", LanguageSet}};
+constexpr VerbEntry kGuid[] = {{"", "", "print the system GUID (GetSystemID)", Guid}};
+constexpr VerbEntry kEnvironment[] = {{"", "NAME", "print a variable (GetEnvironmentVariable)", Environment}};
+constexpr VerbEntry kOption[] = {{"", "OPTION", "tell whether an option is installed (IsOptionPresent)", Option}};
+constexpr VerbEntry kClients[] = {{"", "", "list the connected API clients as XML (GetConnectedTavAPIClients)", Clients}};
+constexpr VerbEntry kEnergy[] = {{"", "", "print the system energy state (GetSysEnergyState)", Energy}};
+constexpr VerbEntry kLink[] = {{"", "", "check the file transfer link (CheckFileTransferLink)", Link}};
+constexpr VerbEntry kVersion[] = {
     {"", "[SYSTEM]", "the same as version system", VersionSystem},
     {"system", "[SYSTEM]", "print the system version (GetVersionInfo, GetVersionInfoFromSystem)", VersionSystem},
     {"release", "[SYSTEM]", "print the release version (GetVersionInfo, GetVersionInfoFromSystem)",
@@ -123,12 +123,12 @@ constexpr VerbSpec kVersion[] = {
     {"name", "", "print the version name (GetVersionName)", VersionName},
     {"product", "PRODUCT", "print a product's version name (GetProductVersionName)", VersionProduct},
 };
-constexpr VerbSpec kError[] = {{"", "",
+constexpr VerbEntry kError[] = {{"", "",
                                 "print the object's last-error text (GetLastErrorInfo); most useful in a batch, "
                                 "after a failing command",
                                 LastError}};
 
-constexpr GroupSpec kGroups[] = {
+constexpr GroupEntry kGroups[] = {
     {"name", "The controller's name", kName},
     {"id", "The controller identifier", kId},
     {"language", "The controller's language", kLanguage},
@@ -144,6 +144,6 @@ constexpr GroupSpec kGroups[] = {
 
 }  // namespace
 
-std::span<const GroupSpec> IdentityGroups() { return kGroups; }
+std::span<const GroupEntry> IdentityGroups() { return kGroups; }
 
 }  // namespace tavctl

@@ -231,7 +231,7 @@ int Ping(Verb& v) {
     return kExitOk;
 }
 
-constexpr VerbSpec kIpc[] = {
+constexpr VerbEntry kIpc[] = {
     {"connect", "NAME [--max-msg N] [--max-size N]", "connect a message slot and print its id (Connect)", Connect,
      "The slot lives as long as this controller object: in a batch, until the end.\n"
      "--max-msg (default 10) and --max-size (default 1024) size its queue.\n"},
@@ -248,10 +248,10 @@ constexpr VerbSpec kIpc[] = {
      "send N messages to the echo slot and print the round-trip rate and latency percentiles", Ping},
 };
 
-constexpr GroupSpec kGroups[] = {{"ipc", "Inter-process message slots", kIpc}};
+constexpr GroupEntry kGroups[] = {{"ipc", "Inter-process message slots", kIpc}};
 
 }  // namespace
 
-std::span<const GroupSpec> IpcGroups() { return kGroups; }
+std::span<const GroupEntry> IpcGroups() { return kGroups; }
 
 }  // namespace tavctl

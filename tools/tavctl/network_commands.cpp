@@ -115,7 +115,7 @@ int TimeServerTest(Verb& v) {
     return v.Get("TestTimeServer", &T::TestTimeServer, &T::UnpackTestTimeServer, server.Get());
 }
 
-constexpr VerbSpec kLan[] = {
+constexpr VerbEntry kLan[] = {
     {"method", "[METHOD]", "print the IP method (GetLANAdaptorIPMethod), or set it: NONE, FIXIP, DHCP", Method},
     {"get", "", "print the method and IP settings (GetLANAdaptorIP)", Get},
     {"config", "", "print the IP settings (GetLANAdaptorIPConfig)", Config},
@@ -125,25 +125,25 @@ constexpr VerbSpec kLan[] = {
      "255.255.255.0 --gateway 192.168.125.254\n"},
     {"info", "", "print the adaptor's current settings and MAC address (GetLANAdaptorInfo)", Info},
 };
-constexpr VerbSpec kTimeZone[] = {
+constexpr VerbEntry kTimeZone[] = {
     {"get", "", "print the time zone (GetTimeZone)", TimeZoneGet},
     {"set", "ZONE", "set the time zone (SetTimeZone)", TimeZoneSet},
 };
-constexpr VerbSpec kTimeServer[] = {
+constexpr VerbEntry kTimeServer[] = {
     {"get", "", "print the time server (GetTimeServer)", TimeServerGet},
     {"set", "SERVER", "set the time server (SetTimeServer)", TimeServerSet},
     {"test", "SERVER", "ask a time server for the time (TestTimeServer)", TimeServerTest},
 };
 
-constexpr GroupSpec kNetworkGroups[] = {{"lan", "The LAN adaptor", kLan}};
-constexpr GroupSpec kTimeGroups[] = {
+constexpr GroupEntry kNetworkGroups[] = {{"lan", "The LAN adaptor", kLan}};
+constexpr GroupEntry kTimeGroups[] = {
     {"timezone", "The controller's time zone", kTimeZone},
     {"timeserver", "The controller's time server", kTimeServer},
 };
 
 }  // namespace
 
-std::span<const GroupSpec> NetworkGroups() { return kNetworkGroups; }
-std::span<const GroupSpec> TimeGroups() { return kTimeGroups; }
+std::span<const GroupEntry> NetworkGroups() { return kNetworkGroups; }
+std::span<const GroupEntry> TimeGroups() { return kTimeGroups; }
 
 }  // namespace tavctl

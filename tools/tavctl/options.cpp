@@ -198,7 +198,7 @@ std::string GeneralHelp() {
             "                       a group and a verb\n"
             "\n"
             "Groups:\n";
-    for (const GroupSpec& group : Groups()) {
+    for (const GroupEntry& group : Groups()) {
         const std::string name = group.name;
         help << "  " << name << std::string(name.size() < 12 ? 12 - name.size() : 1, ' ') << group.summary << "\n";
     }

@@ -163,13 +163,13 @@ int PinState(Verb& v) {
                  &ITavPanel3::UnpackOPModePinCodeLockState);
 }
 
-constexpr VerbSpec kState[] = {
+constexpr VerbEntry kState[] = {
     {"get", "", "print the controller (motors) state (GetControllerState)", StateGet},
     {"set", "STATE [--keyless]", "set the controller state (SetControllerState)", StateSet,
      "STATE: MotorsOn (on), MotorsOff (off), or any other TavControllerState name\n"
      "or number, for the module to refuse. --keyless: SetControllerStateKeyLess.\n"},
 };
-constexpr VerbSpec kMode[] = {
+constexpr VerbEntry kMode[] = {
     {"get", "", "print the operation mode and pending auto conditions (GetOperationMode2)", ModeGet,
      "The reply is taken through the callback so that, in AutoChange, the pending\n"
      "auto conditions are listed with the IDs that autocond ack needs.\n"},
@@ -177,28 +177,28 @@ constexpr VerbSpec kMode[] = {
      "MODE: Auto, Manr, Manf (or another TavOperationMode name or number, for the\n"
      "module to refuse).\n"},
 };
-constexpr VerbSpec kCollision[] = {
+constexpr VerbEntry kCollision[] = {
     {"", "", "print the collision detection state (GetCollisionDetectState)", Collision},
     {"get", "", "the same", Collision},
     {"state", "", "the same", Collision},
 };
-constexpr VerbSpec kAck[] = {
+constexpr VerbEntry kAck[] = {
     {"", "auto|manf|coldet", "acknowledge a mode change or a collision (Acknowledge)", Acknowledge}};
-constexpr VerbSpec kAutoCondition[] = {
+constexpr VerbEntry kAutoCondition[] = {
     {"ack", "ID reset|keep", "answer a pending auto condition (AcknowledgeAutoCondition)", AutoConditionAck,
      "mode get lists the IDs.\n"}};
-constexpr VerbSpec kSpeed[] = {
+constexpr VerbEntry kSpeed[] = {
     {"get", "", "print the speed ratio in percent (GetSpeedRatio)", SpeedGet},
     {"set", "RATIO", "set the speed ratio in percent (SetSpeedRatio)", SpeedSet},
 };
-constexpr VerbSpec kPin[] = {
+constexpr VerbEntry kPin[] = {
     {"lock", "PIN [--permanent]", "lock the operation mode with a PIN (LockOPModePinCode)", PinLock,
      "--permanent: LockOPModePinCode2 with the permanent flag (ITavPanel4).\n"},
     {"unlock", "PIN", "unlock the operation mode (UnlockOPModePinCode)", PinUnlock},
     {"state", "", "print the PIN lock state (GetOPModePinCodeLockState)", PinState},
 };
 
-constexpr GroupSpec kGroups[] = {
+constexpr GroupEntry kGroups[] = {
     {"state", "The controller (motors) state", kState},
     {"mode", "The operation mode", kMode},
     {"collision", "Collision detection", kCollision},
@@ -210,6 +210,6 @@ constexpr GroupSpec kGroups[] = {
 
 }  // namespace
 
-std::span<const GroupSpec> PanelGroups() { return kGroups; }
+std::span<const GroupEntry> PanelGroups() { return kGroups; }
 
 }  // namespace tavctl

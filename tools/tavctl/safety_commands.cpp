@@ -215,7 +215,7 @@ int Units(Verb& v) {
         });
 }
 
-constexpr VerbSpec kSafety[] = {
+constexpr VerbEntry kSafety[] = {
     {"status", "", "print the configuration status (GetConfigStatus)", Status},
     {"load-status", "", "print whether loading a configuration is permitted (GetLoadOperationStatus)", LoadStatus},
     {"mode", "", "print the safety mode (GetSafeyModeStatus)", Mode},
@@ -240,15 +240,15 @@ constexpr VerbSpec kSafety[] = {
      "--drive: the drive module (default 1); --last: the last violation. Up to 16\n"
      "elements of each array are shown, with the count when there are more.\n"},
 };
-constexpr VerbSpec kPsc[] = {{"units", "", "list the units' status (GetPSCUnitStatus)", Units}};
+constexpr VerbEntry kPsc[] = {{"units", "", "list the units' status (GetPSCUnitStatus)", Units}};
 
-constexpr GroupSpec kGroups[] = {
+constexpr GroupEntry kGroups[] = {
     {"safety", "The safety controller", kSafety},
     {"psc", "Positional safety controller units", kPsc},
 };
 
 }  // namespace
 
-std::span<const GroupSpec> SafetyGroups() { return kGroups; }
+std::span<const GroupEntry> SafetyGroups() { return kGroups; }
 
 }  // namespace tavctl

@@ -144,7 +144,7 @@ int MasterGet(Verb& v) {
         });
 }
 
-constexpr VerbSpec kUser[] = {
+constexpr VerbEntry kUser[] = {
     {"logon", "[--local]", "log the user on (LogonUser, LogonUserAsLocal with --local)", Logon},
     {"logoff", "", "log the user off (LogoffUser)", Logoff},
     {"id", "", "print the user's id (GetUserId)", Id},
@@ -153,7 +153,7 @@ constexpr VerbSpec kUser[] = {
     {"grants", "", "print the user's grants (GetUserGrants)", Grants},
     {"list", "", "print the users (GetUserList)", UserList},
 };
-constexpr VerbSpec kRmmp[] = {
+constexpr VerbEntry kRmmp[] = {
     {"request", "none|modify|exec", "ask for manual-mode privileges (RequestManualModePrivileges)", Request},
     {"poll", "", "poll the active request (PollActiveRequest)", Poll},
     {"cancel", "", "cancel the privileges (CancelManualModePrivileges)", Cancel},
@@ -161,19 +161,19 @@ constexpr VerbSpec kRmmp[] = {
     {"state", "", "print the privileges' state (GetManualModePrivilegesState)", PrivilegeState},
     {"pending", "", "print the pending request (GetPendingManualModePrivRequest)", Pending},
 };
-constexpr VerbSpec kMaster[] = {
+constexpr VerbEntry kMaster[] = {
     {"request", "RESOURCE", "take mastership of a resource (RequestMastership)", MasterRequest,
      "RESOURCE: kesto, cfg, motion, infostream or a TavMastershipResource name.\n"
      "Two clients show a conflict: tavctl batch with \"--client 2 master request cfg\".\n"},
     {"release", "RESOURCE", "give mastership back (ReleaseMastership)", MasterRelease},
     {"get", "RESOURCE", "print who holds a resource (GetCurrentMaster)", MasterGet},
 };
-constexpr VerbSpec kUas[] = {
+constexpr VerbEntry kUas[] = {
     {"users", "", "print the users (GetUserList)", UserList},
     {"grants", "", "print the grants (GetGrantList)", GrantList},
 };
 
-constexpr GroupSpec kGroups[] = {
+constexpr GroupEntry kGroups[] = {
     {"user", "Users", kUser},
     {"rmmp", "Manual-mode privileges", kRmmp},
     {"master", "Mastership", kMaster},
@@ -182,6 +182,6 @@ constexpr GroupSpec kGroups[] = {
 
 }  // namespace
 
-std::span<const GroupSpec> UserGroups() { return kGroups; }
+std::span<const GroupEntry> UserGroups() { return kGroups; }
 
 }  // namespace tavctl

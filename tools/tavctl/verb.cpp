@@ -3,7 +3,7 @@
 namespace tavctl {
 
 std::string Verb::Name() const {
-    return *spec.name == '\0' ? std::string(group.name) : std::string(group.name) + " " + spec.name;
+    return *entry.name == '\0' ? std::string(group.name) : std::string(group.name) + " " + entry.name;
 }
 
 std::optional<std::string> Verb::Option(const char* name) {

@@ -71,12 +71,12 @@ struct Last<P, Rest...> : Last<Rest...> {};
 // readers throw UsageError; Interface() throws CommandFailed.
 class Verb {
 public:
-    Verb(Session& session, const GroupSpec& group, const VerbSpec& spec, std::vector<std::string> words)
-        : session(session), group(group), spec(spec), args_(std::move(words)) {}
+    Verb(Session& session, const GroupEntry& group, const VerbEntry& entry, std::vector<std::string> words)
+        : session(session), group(group), entry(entry), args_(std::move(words)) {}
 
     Session& session;
-    const GroupSpec& group;
-    const VerbSpec& spec;
+    const GroupEntry& group;
+    const VerbEntry& entry;
 
     // "group verb", for messages.
     std::string Name() const;

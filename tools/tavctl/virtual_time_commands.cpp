@@ -50,7 +50,7 @@ int Speed(Verb& v) {
     return v.Set("VTSetSpeed", &VT::VTSetSpeed, speed);
 }
 
-constexpr VerbSpec kVirtualTime[] = {
+constexpr VerbEntry kVirtualTime[] = {
     {"state", "[STATE]", "print the virtual time state (VTGetState), or set it (VTSetState)", State,
      "STATE: VTStop (stop), VTFreeRun (free), VTRunSlice (slice), VTNextEvent (next).\n"},
     {"set", "STATE", "set the virtual time state (VTSetState)", StateSet},
@@ -60,10 +60,10 @@ constexpr VerbSpec kVirtualTime[] = {
     {"speed", "[SPEED]", "print the speed (VTGetSpeed), or set it (VTSetSpeed)", Speed},
 };
 
-constexpr GroupSpec kGroups[] = {{"vt", "Virtual time", kVirtualTime}};
+constexpr GroupEntry kGroups[] = {{"vt", "Virtual time", kVirtualTime}};
 
 }  // namespace
 
-std::span<const GroupSpec> VirtualTimeGroups() { return kGroups; }
+std::span<const GroupEntry> VirtualTimeGroups() { return kGroups; }
 
 }  // namespace tavctl

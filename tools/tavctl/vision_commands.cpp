@@ -195,7 +195,7 @@ int Credentials(Verb& v) {
     return v.Set("SetCameraUserCredentials", &L2::SetCameraUserCredentials, index, user.Get(), password.Get());
 }
 
-constexpr VerbSpec kCamera[] = {
+constexpr VerbEntry kCamera[] = {
     {"list", "", "list the cameras (GetNumberOfCameras, GetCameraInfoUsingIndex2)", List},
     {"count", "", "print the number of cameras (GetNumberOfCameras)", Count},
     {"valid", "CAMERA", "tell whether a camera name is valid (IsCameraValid)", Valid},
@@ -215,10 +215,10 @@ constexpr VerbSpec kCamera[] = {
      Credentials},
 };
 
-constexpr GroupSpec kGroups[] = {{"camera", "Vision cameras", kCamera}};
+constexpr GroupEntry kGroups[] = {{"camera", "Vision cameras", kCamera}};
 
 }  // namespace
 
-std::span<const GroupSpec> VisionGroups() { return kGroups; }
+std::span<const GroupEntry> VisionGroups() { return kGroups; }
 
 }  // namespace tavctl
