@@ -6,7 +6,7 @@
 #include <string>
 
 #include "e2e/virtual_controller_fixture.h"
-#include "event_sink.h"
+#include "support/event_sink.h"
 #include "sim/controller_registry.h"
 
 namespace tav::e2e {

@@ -5,7 +5,7 @@
 
 #include <gtest/gtest.h>
 
-#include "event_sink.h"
+#include "support/event_sink.h"
 #include "sim/subscription_hub.h"
 
 namespace tav::sim {

@@ -25,6 +25,7 @@
 #include "TavController.h"
 #include "core/text/convert.h"
 #include "module/server_exports.h"
+#include "support/com_double.h"
 #include "sim/controller_registry.h"
 #include "sim/virtual_controller.h"
 #include "tav/bstr.h"
@@ -81,12 +82,7 @@ public:
         AddRef();
         return S_OK;
     }
-    ULONG STDMETHODCALLTYPE AddRef() override { return ++references_; }
-    ULONG STDMETHODCALLTYPE Release() override {
-        const ULONG left = --references_;
-        if (left == 0) delete this;
-        return left;
-    }
+    TAV_TEST_DOUBLE_REFCOUNT
     HRESULT STDMETHODCALLTYPE OnCommandReply(TavCommandReply* reply) override {
         // A reply's text is read, as a client decoding it would.
         if (reply->data.vt == VT_BSTR && reply->data.bstrVal != nullptr) {
@@ -106,7 +102,7 @@ public:
     std::atomic<long> textUnits{0};
 
 private:
-    std::atomic<ULONG> references_{1};
+    test::RefCount refs_;
 };
 
 ComPtr<ITavController> MakeController(const OleString& url) {

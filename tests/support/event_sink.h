@@ -11,9 +11,10 @@
 
 #include "TavController.h"
 #include "core/text/convert.h"
+#include "support/com_double.h"
 #include "tav/variant.h"
 
-namespace tav::e2e {
+namespace tav::test {
 
 struct ReceivedEvent {
     ULONG userDef = 0;
@@ -38,14 +39,7 @@ public:
         *object = nullptr;
         return E_NOINTERFACE;
     }
-    ULONG STDMETHODCALLTYPE AddRef() override { return ++references_; }
-    ULONG STDMETHODCALLTYPE Release() override {
-        const ULONG left = --references_;
-        if (left == 0) {
-            delete this;
-        }
-        return left;
-    }
+    TAV_TEST_DOUBLE_REFCOUNT
 
     HRESULT STDMETHODCALLTYPE OnChange(TavEventData* event) override {
         ReceivedEvent received;
@@ -85,7 +79,7 @@ public:
 private:
     ~EventSink() = default;
 
-    std::atomic<ULONG> references_{1};
+    RefCount refs_;
     std::mutex mutex_;
     std::condition_variable arrived_;
     std::vector<ReceivedEvent> events_;
@@ -101,4 +95,10 @@ struct SinkRef {
     EventSink* sink;
 };
 
+}  // namespace tav::test
+
+namespace tav::e2e {
+using test::EventSink;
+using test::ReceivedEvent;
+using test::SinkRef;
 }  // namespace tav::e2e
