@@ -9,7 +9,6 @@ namespace tav::test {
 namespace {
 
 constexpr HRESULT kMalformed = HRESULT_FROM_WIN32(ERROR_INVALID_DATA);
-const std::string kClassesKey = "Software\\Classes";
 
 class RegistrarTest : public ::testing::Test {
 protected:

@@ -12,8 +12,6 @@
 namespace tav::test {
 namespace {
 
-const std::string kClassesKey = "Software\\Classes";
-
 // What one class writes, as TakeSnapshot reports it.
 RegistrySnapshot ExpectedEntries(const ClassInfo& info, const std::string& module) {
     const std::string name = info.name;

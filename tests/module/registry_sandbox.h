@@ -33,6 +33,7 @@ private:
 // "Key\Sub|name=text" ("@" for the default value), relative to path; empty
 // when path does not exist.
 using RegistrySnapshot = std::set<std::string>;
+inline const std::string kClassesKey = "Software\\Classes";
 RegistrySnapshot TakeSnapshot(HKEY root, const std::string& path);
 
 // The string value, or "<missing>".

@@ -6,7 +6,7 @@ namespace {
 
 class SpeedAndPinTest : public ControllerTest {};
 
-using Call = std::function<HRESULT(ControllerObject&, TavInParams*, bool nullOut)>;
+using NullableCall = std::function<HRESULT(ControllerObject&, TavInParams*, bool nullOut)>;
 
 TEST_F(SpeedAndPinTest, EveryOperationFollowsTheCallPattern) {
     short ratio = 0;
