@@ -3,7 +3,6 @@
 namespace tav::sim {
 namespace {
 
-bool IsDigit(OLECHAR c) { return c >= OLECHAR('0') && c <= OLECHAR('9'); }
 
 // "-Name" starts a key; "-1" is a negative number.
 bool StartsKey(TextView rest) { return rest.size() >= 2 && rest[0] == OLECHAR('-') && !IsDigit(rest[1]); }

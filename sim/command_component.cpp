@@ -16,7 +16,7 @@
 namespace tav::sim {
 namespace {
 
-constexpr TextView kComponent = OLESTR("TavComCtrl.");
+constexpr TextView kCommandComponent = OLESTR("TavComCtrl.");
 // A controller takes only so many asynchronous requests from one client
 // ahead of their replies; more are refused rather than queued without end.
 constexpr std::size_t kMostWaitingRequests = 256;
@@ -179,7 +179,7 @@ HRESULT CommandComponent::ExecuteEx(TavInParams* rip, TavCommandReply* reply, Ta
 // caller's strings where they are.
 HRESULT CommandComponent::Carry(TavInParams* rip, TavCommandReply* reply, TextView verb, BSTR url, BSTR command,
                                 BSTR args, ULONG clientValue, TextView operation) {
-    auto where = [operation] { return Text(kComponent) + Text(operation); };
+    auto where = [operation] { return Text(kCommandComponent) + Text(operation); };
     if (reply == nullptr) {
         return Fail(E_POINTER, where() + OLESTR(": no reply record"));
     }
@@ -263,7 +263,7 @@ HRESULT CommandComponent::SubscribeConnectionEvents(TavInParams*, TavEventParams
 
 HRESULT CommandComponent::AddSubscription(TavEventParams* params, TextView eventName, BSTR eventArgs, LONG kind,
                                           ULONG* cookie, TextView operation) {
-    const Text where = Text(kComponent) + Text(operation);
+    const Text where = Text(kCommandComponent) + Text(operation);
     if (cookie == nullptr || params == nullptr) {
         return Fail(E_POINTER, where + OLESTR(": no cookie or no subscription parameters"));
     }
@@ -316,7 +316,7 @@ HRESULT CommandComponent::Unsubscribe(TavInParams*, ULONG cookie) {
             hub = hub_;
         }
         if (!hub || !hub->Remove(cookie)) {
-            return Fail(E_INVALIDARG, Text(kComponent) + OLESTR("Unsubscribe: unknown cookie ") + Decimal(cookie));
+            return Fail(E_INVALIDARG, Text(kCommandComponent) + OLESTR("Unsubscribe: unknown cookie ") + Decimal(cookie));
         }
         return S_OK;
     });
@@ -327,7 +327,7 @@ HRESULT CommandComponent::ConnectIPCSink(IUnknown* sink) {
         ComPtr<_ITavIPCMessages> messages;
         if (sink != nullptr &&
             FAILED(sink->QueryInterface(IID__ITavIPCMessages, reinterpret_cast<void**>(&messages)))) {
-            return Fail(E_NOINTERFACE, Text(kComponent) + OLESTR("ConnectIPCSink: the sink is no _ITavIPCMessages"));
+            return Fail(E_NOINTERFACE, Text(kCommandComponent) + OLESTR("ConnectIPCSink: the sink is no _ITavIPCMessages"));
         }
         {
             std::lock_guard lock(mutex_);
@@ -355,7 +355,7 @@ void CommandComponent::LinkMessageSink() {
 HRESULT CommandComponent::SendIPCMessage(TavInParams*, TavIPCHeaderInternal* header, byte* data, LONG size) {
     return Guarded([&] {
         if (header == nullptr) {
-            return Fail(E_POINTER, Text(kComponent) + OLESTR("SendIPCMessage: no message header"));
+            return Fail(E_POINTER, Text(kCommandComponent) + OLESTR("SendIPCMessage: no message header"));
         }
         std::shared_ptr<ControllerModel> bound;
         {
@@ -363,7 +363,7 @@ HRESULT CommandComponent::SendIPCMessage(TavInParams*, TavIPCHeaderInternal* hea
             bound = bound_;
         }
         if (!bound) {
-            return Fail(E_UNEXPECTED, Text(kComponent) + OLESTR("SendIPCMessage: not connected to a controller"));
+            return Fail(E_UNEXPECTED, Text(kCommandComponent) + OLESTR("SendIPCMessage: not connected to a controller"));
         }
         if (auto down = bound->Faults().Transport()) {
             return Fail(down->status, std::move(down->text));
@@ -428,7 +428,7 @@ HRESULT CommandComponent::DeleteControllerFile(TavInParams*, BSTR url, BSTR ctrl
 HRESULT CommandComponent::GetControllerFileSize(TavInParams*, BSTR url, BSTR ctrlPath, ULONG* size) {
     return Guarded([&] {
         if (size == nullptr) {
-            return Fail(E_POINTER, Text(kComponent) + OLESTR("GetControllerFileSize: no size pointer"));
+            return Fail(E_POINTER, Text(kCommandComponent) + OLESTR("GetControllerFileSize: no size pointer"));
         }
         *size = 0;
         return OnFiles(url, OLESTR("GetControllerFileSize"), [&](FileSystem& files, Text& error) {
@@ -446,7 +446,7 @@ template <typename F>
 HRESULT CommandComponent::OnFiles(BSTR url, TextView operation, F&& work) {
     const auto controller = Reach(ViewOf(url));
     if (!controller) {
-        return Fail(E_INVALIDARG, Concat({kComponent, operation, OLESTR(": no controller at URL "), Quoted(ViewOf(url))}));
+        return Fail(E_INVALIDARG, Concat({kCommandComponent, operation, OLESTR(": no controller at URL "), Quoted(ViewOf(url))}));
     }
     if (auto down = controller->Faults().Transport()) {
         return Fail(down->status, std::move(down->text));
@@ -454,14 +454,14 @@ HRESULT CommandComponent::OnFiles(BSTR url, TextView operation, F&& work) {
     Text error;
     const bool done = controller->Update(
         [&](ModelState& state, EventPosts&) { return work(state.Part<FileSystem>(), error); });
-    return done ? S_OK : Fail(kStatusNotFound, Concat({kComponent, operation, OLESTR(": "), error}));
+    return done ? S_OK : Fail(kStatusNotFound, Concat({kCommandComponent, operation, OLESTR(": "), error}));
 }
 
 // The file link is the command link: up unless the transport is failing.
 HRESULT CommandComponent::CheckLink(TavInParams* rip, TavCommandReply* reply) {
     return Guarded([&] {
         if (reply == nullptr) {
-            return Fail(E_POINTER, Text(kComponent) + OLESTR("CheckLink: no reply record"));
+            return Fail(E_POINTER, Text(kCommandComponent) + OLESTR("CheckLink: no reply record"));
         }
         std::shared_ptr<ControllerModel> bound;
         {
@@ -469,7 +469,7 @@ HRESULT CommandComponent::CheckLink(TavInParams* rip, TavCommandReply* reply) {
             bound = bound_;
         }
         if (!bound) {
-            return Fail(E_UNEXPECTED, Text(kComponent) + OLESTR("CheckLink: not connected to a controller"));
+            return Fail(E_UNEXPECTED, Text(kCommandComponent) + OLESTR("CheckLink: not connected to a controller"));
         }
         if (auto down = bound->Faults().Transport()) {
             return Fail(down->status, std::move(down->text));
@@ -483,7 +483,7 @@ HRESULT CommandComponent::GetLastErrorInfo(BSTR* errorText) { return lastError_.
 HRESULT CommandComponent::BindController(BSTR url) {
     return Guarded([&] {
         if (!Reach(ViewOf(url))) {
-            return Fail(E_INVALIDARG, Text(kComponent) + OLESTR("BindController: no controller at URL ") +
+            return Fail(E_INVALIDARG, Text(kCommandComponent) + OLESTR("BindController: no controller at URL ") +
                                           Quoted(ViewOf(url)));
         }
         return S_OK;

@@ -58,6 +58,11 @@ const CommandIndex& Index() {
 
 }  // namespace
 
+Reply BadArguments(const Command& command, TextView expected) {
+    return Refuse(kStatusBadArgument, Text(command.name) + OLESTR(": expected ") + Text(expected) + OLESTR(", got ") +
+                                          Quoted(command.args));
+}
+
 std::span<const Subsystem* const> Subsystems() {
 #define TAV_SIM_SUBSYSTEM(name) &name##Subsystem(),
     static const Subsystem* const all[] = {

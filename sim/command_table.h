@@ -17,6 +17,10 @@ struct Command {
     Caller caller{};
 };
 
+// The refusal of arguments that do not read as `expected`:
+// "NAME: expected EXPECTED, got \"ARGS\"".
+Reply BadArguments(const Command& command, TextView expected);
+
 // Where a command is served: most at the controller's URL, a few at a
 // service below it (environment variables at URL + "/DHROOT").
 enum class Service { Controller, DhRoot };

@@ -18,5 +18,10 @@ struct Reply {
 inline Reply Answer(Text text) { return Reply{S_OK, std::move(text), true}; }
 inline Reply Done() { return Reply{}; }
 inline Reply Refuse(HRESULT status, Text text) { return Reply{status, std::move(text), true}; }
+// The refusal of a command the controller names in its error text:
+// "COMMAND: WHY".
+inline Reply Refused(TextView command, HRESULT status, TextView why) {
+    return Refuse(status, Concat({command, OLESTR(": "), why}));
+}
 
 }  // namespace tav::sim

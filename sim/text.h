@@ -34,6 +34,7 @@ std::optional<std::int32_t> ParseSigned(TextView text);
 
 bool EqualsIgnoringCase(TextView a, TextView b);
 bool IsBlank(OLECHAR c);
+inline bool IsDigit(OLECHAR c) { return c >= OLECHAR('0') && c <= OLECHAR('9'); }
 TextView Trim(TextView text);
 
 // The text in double quotes, as the controller quotes names in its texts.

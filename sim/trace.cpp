@@ -69,7 +69,7 @@ std::string Quote(TextView text) {
     return out + "\"";
 }
 
-std::string StatusText(HRESULT status) {
+std::string StatusLabel(HRESULT status) {
     if (status == S_OK) {
         return "S_OK";
     }
@@ -107,7 +107,7 @@ void Trace(const TraceRecord& record) {
 std::string TraceLine(const TraceRecord& record) {
     const auto micros = std::chrono::duration_cast<std::chrono::microseconds>(record.took).count();
     std::string line = "client " + std::to_string(record.client) + " " + Narrow(record.verb) + " " +
-                       Narrow(record.command) + " " + Quote(record.args) + " -> " + StatusText(record.status);
+                       Narrow(record.command) + " " + Quote(record.args) + " -> " + StatusLabel(record.status);
     if (record.hasText) {
         line += " " + Quote(record.text);
     }

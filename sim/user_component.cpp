@@ -10,7 +10,7 @@
 namespace tav::sim {
 namespace {
 
-constexpr TextView kComponent = OLESTR("TavUser.");
+constexpr TextView kUserComponent = OLESTR("TavUser.");
 
 }  // namespace
 
@@ -52,13 +52,13 @@ HRESULT UserComponent::Initialize(BSTR url, IUnknown* commandComponent) {
     return Guarded([&] {
         const Text urlText = FromBstr(url);
         if (!ControllerAt(urlText)) {
-            return Fail(E_INVALIDARG, Text(kComponent) + OLESTR("Initialize: no controller at URL \"") + urlText +
+            return Fail(E_INVALIDARG, Text(kUserComponent) + OLESTR("Initialize: no controller at URL \"") + urlText +
                                           OLESTR("\""));
         }
         ComPtr<ITavComCtrl> commands;
         if (commandComponent == nullptr ||
             FAILED(commandComponent->QueryInterface(IID_ITavComCtrl, reinterpret_cast<void**>(&commands)))) {
-            return Fail(E_NOINTERFACE, Text(kComponent) + OLESTR("Initialize: no command component"));
+            return Fail(E_NOINTERFACE, Text(kUserComponent) + OLESTR("Initialize: no command component"));
         }
         // Another command component (a test's) simply is not told.
         ComPtr<IControllerBinding> binding;
@@ -66,7 +66,7 @@ HRESULT UserComponent::Initialize(BSTR url, IUnknown* commandComponent) {
         if (SUCCEEDED(commandComponent->QueryInterface(IID_IControllerBinding, reinterpret_cast<void**>(&binding)))) {
             const HRESULT hr = binding->BindController(url);
             if (FAILED(hr)) {
-                return Fail(hr, Text(kComponent) + OLESTR("Initialize: the command component refused the URL"));
+                return Fail(hr, Text(kUserComponent) + OLESTR("Initialize: the command component refused the URL"));
             }
             binding->GetClientId(&clientId);
         }
@@ -93,7 +93,7 @@ HRESULT UserComponent::Send(TavInParams* rip, TextView operation, TextView verb,
         url = url_;
     }
     if (!commands) {
-        return Fail(E_UNEXPECTED, Concat({kComponent, operation, OLESTR(": not initialized")}));
+        return Fail(E_UNEXPECTED, Concat({kUserComponent, operation, OLESTR(": not initialized")}));
     }
     const Bstr verbText{OleStringView(verb)};
     const Bstr urlText{OleStringView(url)};
@@ -110,14 +110,14 @@ HRESULT UserComponent::Send(TavInParams* rip, TextView operation, TextView verb,
         if (SUCCEEDED(commands.As(errors))) {
             errors->GetLastErrorInfo(text.Receive());
         }
-        return Fail(hr, Concat({kComponent, operation, OLESTR(": "), FromBstr(text.Get())}));
+        return Fail(hr, Concat({kUserComponent, operation, OLESTR(": "), FromBstr(text.Get())}));
     }
     if (rip != nullptr && rip->callType != Sync) {
         return S_OK;
     }
     const Text replyText = data.Get()->vt == VT_BSTR ? FromBstr(data.Get()->bstrVal) : Text();
     if (FAILED(record.status)) {
-        return Fail(record.status, Concat({kComponent, operation, OLESTR(": "), replyText}));
+        return Fail(record.status, Concat({kUserComponent, operation, OLESTR(": "), replyText}));
     }
     if (reply != nullptr) {
         *reply = replyText;
@@ -205,9 +205,9 @@ HRESULT DecodeReply(const Text& reply, Unpack&& unpack) {
 
 HRESULT UserComponent::Decoded(HRESULT hr, TextView operation, TextView what) {
     if (hr == E_FAIL) {
-        return Fail(E_FAIL, Concat({kComponent, operation, OLESTR(": not "), what}));
+        return Fail(E_FAIL, Concat({kUserComponent, operation, OLESTR(": not "), what}));
     }
-    return FAILED(hr) ? Fail(hr, Concat({kComponent, operation, OLESTR(": out of memory")})) : S_OK;
+    return FAILED(hr) ? Fail(hr, Concat({kUserComponent, operation, OLESTR(": out of memory")})) : S_OK;
 }
 
 HRESULT UserComponent::LogonUser(TavInParams* rip) {
@@ -251,7 +251,7 @@ HRESULT UserComponent::UnpackManualModePrivRequestEvent(VARIANT* data, TavLoginI
     return Guarded([&] {
         const TextView operation = OLESTR("UnpackManualModePrivRequestEvent");
         if (userId == nullptr || priv == nullptr || user == nullptr) {
-            return Fail(E_POINTER, Concat({kComponent, operation, OLESTR(": invalid out-pointer")}));
+            return Fail(E_POINTER, Concat({kUserComponent, operation, OLESTR(": invalid out-pointer")}));
         }
         *userId = 0;
         *priv = TavManualModePrivileges_None;
@@ -294,7 +294,7 @@ HRESULT UserComponent::UnpackManualModePrivilegesState(VARIANT* data, ULONG clie
     return Guarded([&] {
         const TextView operation = OLESTR("UnpackManualModePrivilegesState");
         if (state == nullptr || user == nullptr || thisIsMe == nullptr) {
-            return Fail(E_POINTER, Concat({kComponent, operation, OLESTR(": invalid out-pointer")}));
+            return Fail(E_POINTER, Concat({kUserComponent, operation, OLESTR(": invalid out-pointer")}));
         }
         *state = TavManualModePrivilegesState_None;
         *thisIsMe = 0;
@@ -311,7 +311,7 @@ HRESULT UserComponent::UnpackManualModePrivilegesState(VARIANT* data, ULONG clie
 HRESULT UserComponent::GetUserGrants(TavInParams* rip, BSTR* grants) {
     return Guarded([&] {
         if (grants == nullptr) {
-            return Fail(E_POINTER, Text(kComponent) + OLESTR("GetUserGrants: invalid out-pointer"));
+            return Fail(E_POINTER, Text(kUserComponent) + OLESTR("GetUserGrants: invalid out-pointer"));
         }
         *grants = nullptr;
         Text reply;
@@ -322,7 +322,7 @@ HRESULT UserComponent::GetUserGrants(TavInParams* rip, BSTR* grants) {
         }
         Bstr text{OleStringView(reply)};
         if (text.Get() == nullptr) {
-            return Fail(E_OUTOFMEMORY, Text(kComponent) + OLESTR("GetUserGrants: out of memory"));
+            return Fail(E_OUTOFMEMORY, Text(kUserComponent) + OLESTR("GetUserGrants: out of memory"));
         }
         *grants = text.Detach();
         return S_OK;
@@ -353,7 +353,7 @@ HRESULT UserComponent::UnpackPendingManualModePrivRequest(VARIANT* data, TavLogi
 HRESULT UserComponent::GetUserId(TavInParams* rip, ULONG* userId) {
     return Guarded([&] {
         if (userId == nullptr) {
-            return Fail(E_POINTER, Text(kComponent) + OLESTR("GetUserId: invalid out-pointer"));
+            return Fail(E_POINTER, Text(kUserComponent) + OLESTR("GetUserId: invalid out-pointer"));
         }
         *userId = 0;
         Text reply;
@@ -365,7 +365,7 @@ HRESULT UserComponent::GetUserId(TavInParams* rip, ULONG* userId) {
         const auto pairs = Arguments::Parse(reply);
         const auto id = pairs ? pairs->Unsigned(OLESTR("-UserId")) : std::nullopt;
         if (!id) {
-            return Fail(E_FAIL, Text(kComponent) + OLESTR("GetUserId: bad reply ") + Quoted(reply));
+            return Fail(E_FAIL, Text(kUserComponent) + OLESTR("GetUserId: bad reply ") + Quoted(reply));
         }
         *userId = *id;
         return S_OK;
@@ -375,7 +375,7 @@ HRESULT UserComponent::GetUserId(TavInParams* rip, ULONG* userId) {
 HRESULT UserComponent::ImpersonateUser(TavInParams* rip, ULONG userId, ULONG* cid) {
     return Guarded([&] {
         if (cid == nullptr) {
-            return Fail(E_POINTER, Text(kComponent) + OLESTR("ImpersonateUser: invalid out-pointer"));
+            return Fail(E_POINTER, Text(kUserComponent) + OLESTR("ImpersonateUser: invalid out-pointer"));
         }
         *cid = 0;
         Text reply;
@@ -388,7 +388,7 @@ HRESULT UserComponent::ImpersonateUser(TavInParams* rip, ULONG userId, ULONG* ci
         const auto pairs = Arguments::Parse(reply);
         const auto other = pairs ? pairs->Unsigned(OLESTR("-Cid")) : std::nullopt;
         if (!other) {
-            return Fail(E_FAIL, Text(kComponent) + OLESTR("ImpersonateUser: bad reply ") + Quoted(reply));
+            return Fail(E_FAIL, Text(kUserComponent) + OLESTR("ImpersonateUser: bad reply ") + Quoted(reply));
         }
         *cid = *other;
         std::lock_guard lock(mutex_);
@@ -443,7 +443,7 @@ HRESULT UserComponent::UnpackCurrentMaster(VARIANT* data, ULONG cid, TavMastersh
     return Guarded([&] {
         const TextView operation = OLESTR("UnpackCurrentMaster");
         if (status == nullptr || loginInfo == nullptr || thisIsMe == nullptr) {
-            return Fail(E_POINTER, Concat({kComponent, operation, OLESTR(": invalid out-pointer")}));
+            return Fail(E_POINTER, Concat({kUserComponent, operation, OLESTR(": invalid out-pointer")}));
         }
         *status = TavMastershipStatus_None;
         *thisIsMe = 0;

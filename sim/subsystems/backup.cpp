@@ -32,10 +32,6 @@ struct BackupJob {
 
 Text SystemFolder(const ModelState& state) { return JoinPath(kSystemsDevice, state.currentSystem); }
 
-Reply Refused(TextView command, HRESULT status, TextView text) {
-    return Refuse(status, Concat({command, OLESTR(": "), text}));
-}
-
 std::optional<Text> FolderKey(TextView path) {
     const auto key = FileSystem::Normalise(WithoutControllerPrefix(path));
     if (!key || key->empty() || key->find(OLECHAR(':')) != Text::npos) {
@@ -253,22 +249,20 @@ Reply VersionInfoFromBackup(ControllerModel& controller, const Command& command)
     });
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Set"), OLESTR("Backup"), StartBackup},
-    {OLESTR("Get"), OLESTR("BackupState"), GetBackupState},
-    {OLESTR("Set"), OLESTR("CheckRestore"), CheckRestore},
-    {OLESTR("Set"), OLESTR("Restore"), Restore},
-    {OLESTR("Get"), OLESTR("VersionInfoFromBackup"), VersionInfoFromBackup},
-};
-
-// "BackupSub" is posted when a backup ends (PostBackupEvent).
-constexpr EventRow kEvents[] = {
-    {kBackupEvent, EventStyle::Pulse, nullptr},
-};
-
 }  // namespace
 
 const Subsystem& BackupSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Set"), OLESTR("Backup"), StartBackup},
+        {OLESTR("Get"), OLESTR("BackupState"), GetBackupState},
+        {OLESTR("Set"), OLESTR("CheckRestore"), CheckRestore},
+        {OLESTR("Set"), OLESTR("Restore"), Restore},
+        {OLESTR("Get"), OLESTR("VersionInfoFromBackup"), VersionInfoFromBackup},
+    };
+    // "BackupSub" is posted when a backup ends (PostBackupEvent).
+    static constexpr EventRow kEvents[] = {
+        {kBackupEvent, EventStyle::Pulse, nullptr},
+    };
     static constexpr Subsystem subsystem{kRows, kEvents};
     return subsystem;
 }

@@ -61,16 +61,15 @@ Reply SetRestart(ControllerModel& controller, const Command& command) {
     return Done();
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("SystemClock"), GetSystemClock},
-    {OLESTR("Set"), OLESTR("SystemClock"), SetSystemClock},
-    {OLESTR("Get"), OLESTR("SystemStartupClock"), GetSystemStartupClock},
-    {OLESTR("Set"), OLESTR("Restart"), SetRestart},
-};
-
 }  // namespace
 
 const Subsystem& ClockSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("SystemClock"), GetSystemClock},
+        {OLESTR("Set"), OLESTR("SystemClock"), SetSystemClock},
+        {OLESTR("Get"), OLESTR("SystemStartupClock"), GetSystemStartupClock},
+        {OLESTR("Set"), OLESTR("Restart"), SetRestart},
+    };
     static constexpr Subsystem subsystem{kRows};
     return subsystem;
 }

@@ -104,11 +104,6 @@ bool ChangeDevice(ControllerModel& controller, TextView name, F change) {
     });
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("StorageDevice"), GetStorageDevices},
-    {OLESTR("Get"), OLESTR("StorageDevice2"), GetStorageDevices2},
-};
-
 }  // namespace
 
 Text DeviceOf(TextView path) {
@@ -181,6 +176,10 @@ std::optional<Failure> WriteRefusal(const ModelState& state, TextView path, std:
 }
 
 const Subsystem& DevicesSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("StorageDevice"), GetStorageDevices},
+        {OLESTR("Get"), OLESTR("StorageDevice2"), GetStorageDevices2},
+    };
     static constexpr Subsystem subsystem{kRows};
     return subsystem;
 }

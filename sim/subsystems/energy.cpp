@@ -13,20 +13,18 @@ Reply GetSysEnergyState(ControllerModel& controller, const Command&) {
     return Answer(controller.Read([](const ModelState& state) { return EnergyText(state); }));
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("SysEnergyState"), GetSysEnergyState},
-};
-
 // "SysEnergyStateSub": the Get reply.
 Text EnergyEvent(const ModelState& state, const Arguments&) { return EnergyText(state); }
-
-constexpr EventRow kEvents[] = {
-    {OLESTR("SysEnergyStateSub"), EventStyle::Value, EnergyEvent},
-};
 
 }  // namespace
 
 const Subsystem& EnergySubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("SysEnergyState"), GetSysEnergyState},
+    };
+    static constexpr EventRow kEvents[] = {
+        {OLESTR("SysEnergyStateSub"), EventStyle::Value, EnergyEvent},
+    };
     static constexpr Subsystem subsystem{kRows, kEvents};
     return subsystem;
 }

@@ -38,10 +38,6 @@ Text ParentOf(const Text& key) {
 
 Text NameOf(const Text& key) { return key.substr(key.rfind(OLECHAR('/')) + 1); }
 
-Reply Refused(TextView command, HRESULT status, TextView text) {
-    return Refuse(status, Concat({command, OLESTR(": "), text}));
-}
-
 // Paths arrive with the controller's prefix removed; a path the client left
 // as a local one names nothing on the controller.
 std::optional<Text> ControllerKey(TextView path) {
@@ -114,7 +110,7 @@ Reply Copy(ControllerModel& controller, const Command& command, bool folder) {
 Reply CopyFile(ControllerModel& controller, const Command& command) { return Copy(controller, command, false); }
 Reply CopyDir(ControllerModel& controller, const Command& command) { return Copy(controller, command, true); }
 
-Text StatusText(HRESULT result) { return OLESTR("-pstatus ") + Decimal(static_cast<std::uint32_t>(result)); }
+Text JobStatusText(HRESULT result) { return OLESTR("-pstatus ") + Decimal(static_cast<std::uint32_t>(result)); }
 
 // Writes a job's file, or tells the result code why it could not.
 HRESULT WriteJobFile(ModelState& state, const Text& path, std::string bytes) {
@@ -179,7 +175,7 @@ Reply StartDiagnostics(ControllerModel& controller, const Command& command) {
 }
 
 Reply GetDiagnosticsStatus(ControllerModel& controller, const Command&) {
-    return Answer(controller.Read([](const ModelState& state) { return StatusText(state.Part<DiagnosticsJob>().result); }));
+    return Answer(controller.Read([](const ModelState& state) { return JobStatusText(state.Part<DiagnosticsJob>().result); }));
 }
 
 // A small 24-bit bitmap of the pendant's screen: a grey frame.
@@ -241,31 +237,29 @@ Reply StartScreenDump(ControllerModel& controller, const Command& command) {
 }
 
 Reply GetScreenDumpStatus(ControllerModel& controller, const Command&) {
-    return Answer(controller.Read([](const ModelState& state) { return StatusText(state.Part<ScreenDumpJob>().result); }));
+    return Answer(controller.Read([](const ModelState& state) { return JobStatusText(state.Part<ScreenDumpJob>().result); }));
 }
-
-constexpr CommandRow kRows[] = {
-    {OLESTR("Set"), OLESTR("CopyFile"), CopyFile},
-    {OLESTR("Set"), OLESTR("CopyDir"), CopyDir},
-    {OLESTR("Set"), OLESTR("SystemDiagnostics"), StartDiagnostics},
-    {OLESTR("Get"), OLESTR("SystemDiagnostics"), GetDiagnosticsStatus},
-    {OLESTR("Set"), OLESTR("Dorvel"), StartScreenDump},
-    {OLESTR("Get"), OLESTR("Dorvel"), GetScreenDumpStatus},
-};
 
 // Both events carry the job's status as its Get does: "-pstatus <code>",
 // the code in unsigned decimal; they change when a job starts and ends.
-Text DiagnosticsEvent(const ModelState& state, const Arguments&) { return StatusText(state.Part<DiagnosticsJob>().result); }
-Text ScreenDumpEvent(const ModelState& state, const Arguments&) { return StatusText(state.Part<ScreenDumpJob>().result); }
-
-constexpr EventRow kEvents[] = {
-    {OLESTR("SystemDiagnostics"), EventStyle::Value, DiagnosticsEvent},
-    {OLESTR("TavDorvel"), EventStyle::Value, ScreenDumpEvent},
-};
+Text DiagnosticsEvent(const ModelState& state, const Arguments&) { return JobStatusText(state.Part<DiagnosticsJob>().result); }
+Text ScreenDumpEvent(const ModelState& state, const Arguments&) { return JobStatusText(state.Part<ScreenDumpJob>().result); }
 
 }  // namespace
 
 const Subsystem& FilesSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Set"), OLESTR("CopyFile"), CopyFile},
+        {OLESTR("Set"), OLESTR("CopyDir"), CopyDir},
+        {OLESTR("Set"), OLESTR("SystemDiagnostics"), StartDiagnostics},
+        {OLESTR("Get"), OLESTR("SystemDiagnostics"), GetDiagnosticsStatus},
+        {OLESTR("Set"), OLESTR("Dorvel"), StartScreenDump},
+        {OLESTR("Get"), OLESTR("Dorvel"), GetScreenDumpStatus},
+    };
+    static constexpr EventRow kEvents[] = {
+        {OLESTR("SystemDiagnostics"), EventStyle::Value, DiagnosticsEvent},
+        {OLESTR("TavDorvel"), EventStyle::Value, ScreenDumpEvent},
+    };
     static constexpr Subsystem subsystem{kRows, kEvents};
     return subsystem;
 }

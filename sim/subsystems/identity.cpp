@@ -8,10 +8,6 @@
 namespace tav::sim {
 namespace {
 
-Reply BadArguments(const Command& command, TextView expected) {
-    return Refuse(kStatusBadArgument,
-                  Text(command.name) + OLESTR(": expected ") + Text(expected) + OLESTR(", got ") + Quoted(command.args));
-}
 
 // The value of the first of `keys` present in the argument text.
 std::optional<Text> ValueOf(const Command& command, std::initializer_list<TextView> keys) {
@@ -151,25 +147,24 @@ Reply GetProductVersionName(ControllerModel& controller, const Command& command)
     });
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("CtrlName"), GetControllerName},
-    {OLESTR("Set"), OLESTR("CtrlName"), SetControllerName},
-    {OLESTR("Get"), OLESTR("CtrlID"), GetControllerId},
-    {OLESTR("Set"), OLESTR("CtrlID"), SetControllerId},
-    {OLESTR("Get"), OLESTR("GUID"), GetSystemGuid},
-    {OLESTR("Get"), OLESTR("VersionInfo"), GetVersionInfo},
-    {OLESTR("Get"), OLESTR("SystemInfo"), GetSystemInfo},
-    {OLESTR("Get"), OLESTR("EnvironmentVar"), GetEnvironmentVariable, Service::DhRoot},
-    {OLESTR("Get"), OLESTR("IsOptionPresent"), IsOptionPresent},
-    {OLESTR("Set"), OLESTR("Language"), SetLanguage},
-    {OLESTR("Get"), OLESTR("ConnectedClients"), GetConnectedClients},
-    {OLESTR("Get"), OLESTR("VersionName"), GetVersionName},
-    {OLESTR("Get"), OLESTR("ProductVersionName"), GetProductVersionName},
-};
-
 }  // namespace
 
 const Subsystem& IdentitySubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("CtrlName"), GetControllerName},
+        {OLESTR("Set"), OLESTR("CtrlName"), SetControllerName},
+        {OLESTR("Get"), OLESTR("CtrlID"), GetControllerId},
+        {OLESTR("Set"), OLESTR("CtrlID"), SetControllerId},
+        {OLESTR("Get"), OLESTR("GUID"), GetSystemGuid},
+        {OLESTR("Get"), OLESTR("VersionInfo"), GetVersionInfo},
+        {OLESTR("Get"), OLESTR("SystemInfo"), GetSystemInfo},
+        {OLESTR("Get"), OLESTR("EnvironmentVar"), GetEnvironmentVariable, Service::DhRoot},
+        {OLESTR("Get"), OLESTR("IsOptionPresent"), IsOptionPresent},
+        {OLESTR("Set"), OLESTR("Language"), SetLanguage},
+        {OLESTR("Get"), OLESTR("ConnectedClients"), GetConnectedClients},
+        {OLESTR("Get"), OLESTR("VersionName"), GetVersionName},
+        {OLESTR("Get"), OLESTR("ProductVersionName"), GetProductVersionName},
+    };
     static constexpr Subsystem subsystem{kRows};
     return subsystem;
 }

@@ -48,11 +48,7 @@ constexpr VersionFile kVersionFiles[] = {
     {OLESTR("CTRL_PROD_SETTING"), OLESTR("production_settings.txt")},
 };
 
-Reply Refused(TextView command, HRESULT status, TextView text) {
-    return Refuse(status, Concat({command, OLESTR(": "), text}));
-}
-
-Reply GetState(ControllerModel& controller, const Command&) {
+Reply GetInboxState(ControllerModel& controller, const Command&) {
     return Answer(controller.Read([](const ModelState& state) {
         return Concat({OLESTR("-state "), WordOf(state.Part<Inbox>().state)});
     }));
@@ -238,19 +234,18 @@ Reply UpgradeBootServer(ControllerModel& controller, const Command& command) {
     });
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("InboxState"), GetState},
-    {OLESTR("Get"), OLESTR("InboxIsBusy"), GetBusy},
-    {OLESTR("Get"), OLESTR("InboxPath"), GetPath},
-    {OLESTR("Set"), OLESTR("InboxOperation"), Operate},
-    {OLESTR("Get"), OLESTR("InboxVersion"), GetVersion},
-    {OLESTR("Set"), OLESTR("InboxPreInstallCheck"), PreInstallCheck},
-    {OLESTR("Set"), OLESTR("InboxUpgradeBootServer"), UpgradeBootServer},
-};
-
 }  // namespace
 
 const Subsystem& InboxSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("InboxState"), GetInboxState},
+        {OLESTR("Get"), OLESTR("InboxIsBusy"), GetBusy},
+        {OLESTR("Get"), OLESTR("InboxPath"), GetPath},
+        {OLESTR("Set"), OLESTR("InboxOperation"), Operate},
+        {OLESTR("Get"), OLESTR("InboxVersion"), GetVersion},
+        {OLESTR("Set"), OLESTR("InboxPreInstallCheck"), PreInstallCheck},
+        {OLESTR("Set"), OLESTR("InboxUpgradeBootServer"), UpgradeBootServer},
+    };
     static constexpr Subsystem subsystem{kRows};
     return subsystem;
 }

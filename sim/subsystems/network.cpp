@@ -97,9 +97,6 @@ struct LanAdaptorState {
     Text mac = OLESTR("00:80:F4:0C:3A:21");
 };
 
-// "unspec" stands for a value that is not set.
-constexpr TextView kUnspecified = OLESTR("unspec");
-
 Text AddressFields(const std::optional<Ipv4Settings>& settings) {
     if (!settings) {
         return Concat({OLESTR("-Address "), kUnspecified, OLESTR(" -Submask "), kUnspecified, OLESTR(" -Gateway "),
@@ -117,10 +114,6 @@ std::optional<Ipv4Settings> CurrentSettings(const LanAdaptorState& lan) {
         case IpMethod::None: break;
     }
     return std::nullopt;
-}
-
-Reply Refused(TextView command, HRESULT status, TextView why) {
-    return Refuse(status, Concat({command, OLESTR(": "), why}));
 }
 
 // The address, mask and gateway of a setting ("\"\"" for no gateway), as
@@ -247,21 +240,20 @@ Reply SetMethodAndSettings(ControllerModel& controller, const Command& command) 
     return Done();
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("LANAdaptorMethod"), GetMethod},
-    {OLESTR("Set"), OLESTR("LANAdaptorMethod"), SetMethod},
-    {OLESTR("Get"), OLESTR("LANAdaptorIP"), GetFixedSettings},
-    {OLESTR("Set"), OLESTR("LANAdaptorIP"), SetFixedSettings},
-    {OLESTR("Get"), OLESTR("LANAdaptorInfo"), GetInfo},
-    {OLESTR("Get"), OLESTR("LANAdaptor"), GetMethodAndSettings},
-    {OLESTR("Set"), OLESTR("LANAdaptor"), SetMethodAndSettings},
-};
-
 }  // namespace
 
 bool LanAdaptorUp(const ModelState& state) { return state.Part<LanAdaptorState>().method != IpMethod::None; }
 
 const Subsystem& NetworkSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("LANAdaptorMethod"), GetMethod},
+        {OLESTR("Set"), OLESTR("LANAdaptorMethod"), SetMethod},
+        {OLESTR("Get"), OLESTR("LANAdaptorIP"), GetFixedSettings},
+        {OLESTR("Set"), OLESTR("LANAdaptorIP"), SetFixedSettings},
+        {OLESTR("Get"), OLESTR("LANAdaptorInfo"), GetInfo},
+        {OLESTR("Get"), OLESTR("LANAdaptor"), GetMethodAndSettings},
+        {OLESTR("Set"), OLESTR("LANAdaptor"), SetMethodAndSettings},
+    };
     static constexpr Subsystem subsystem{kRows};
     return subsystem;
 }

@@ -19,6 +19,8 @@ struct Ipv4Settings {
 // controller takes no "1.2.3.4xyz" and no " 1.2.3.4", which a client lets by.
 std::optional<std::uint32_t> ParseIpv4(TextView text);
 Text Ipv4Text(std::uint32_t address);
+// What the controller writes for an address, mask or gateway that is not set.
+inline constexpr TextView kUnspecified = OLESTR("unspec");
 
 // Why the settings cannot be used on a network (a mask with holes, an
 // address that is the subnet's own or its broadcast, a gateway outside the

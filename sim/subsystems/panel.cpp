@@ -182,30 +182,28 @@ Reply GetCollisionDetectState(ControllerModel& controller, const Command&) {
     return Answer(Text(controller.Read([](const ModelState& state) { return CollisionWord(state.collision); })));
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("State"), GetState},
-    {OLESTR("Set"), OLESTR("State"), SetState},
-    {OLESTR("Set"), OLESTR("StateUsingKeyLess"), SetStateUsingKeyLess},
-    {OLESTR("Get"), OLESTR("Mode"), GetMode},
-    {OLESTR("Set"), OLESTR("OPMode"), SetOperationMode},
-    {OLESTR("Set"), OLESTR("Ack"), SetAcknowledge},
-    {OLESTR("Set"), OLESTR("AutoCondAck"), SetAutoConditionAck},
-    {OLESTR("Get"), OLESTR("ColdetState"), GetCollisionDetectState},
-};
-
 Text StateEvent(const ModelState& state, const Arguments&) { return state.motors; }
 Text ModeEvent(const ModelState& state, const Arguments&) { return ModeText(state); }
 Text AutoConditionEvent(const ModelState& state, const Arguments&) { return AutoConditionList(state); }
 
-constexpr EventRow kEvents[] = {
-    {OLESTR("State"), EventStyle::Value, StateEvent},
-    {OLESTR("Mode"), EventStyle::Value, ModeEvent},
-    {OLESTR("AutoCondSub"), EventStyle::Value, AutoConditionEvent},
-};
-
 }  // namespace
 
 const Subsystem& PanelSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("State"), GetState},
+        {OLESTR("Set"), OLESTR("State"), SetState},
+        {OLESTR("Set"), OLESTR("StateUsingKeyLess"), SetStateUsingKeyLess},
+        {OLESTR("Get"), OLESTR("Mode"), GetMode},
+        {OLESTR("Set"), OLESTR("OPMode"), SetOperationMode},
+        {OLESTR("Set"), OLESTR("Ack"), SetAcknowledge},
+        {OLESTR("Set"), OLESTR("AutoCondAck"), SetAutoConditionAck},
+        {OLESTR("Get"), OLESTR("ColdetState"), GetCollisionDetectState},
+    };
+    static constexpr EventRow kEvents[] = {
+        {OLESTR("State"), EventStyle::Value, StateEvent},
+        {OLESTR("Mode"), EventStyle::Value, ModeEvent},
+        {OLESTR("AutoCondSub"), EventStyle::Value, AutoConditionEvent},
+    };
     static constexpr Subsystem subsystem{kRows, kEvents};
     return subsystem;
 }

@@ -86,18 +86,8 @@ Reply Unlock(ControllerModel& controller, const Command& command) {
     });
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("OPModePinCodeLockState"), GetLockState},
-    {OLESTR("Set"), OLESTR("LockOPModePinCode"), Lock},
-    {OLESTR("Set"), OLESTR("UnlockOPModePinCode"), Unlock},
-};
-
 // "OPModePinCodeLockState": the Get reply, "-lockstate locked" and so on.
 Text LockStateEvent(const ModelState& state, const Arguments&) { return LockStateText(state); }
-
-constexpr EventRow kEvents[] = {
-    {OLESTR("OPModePinCodeLockState"), EventStyle::Value, LockStateEvent},
-};
 
 }  // namespace
 
@@ -113,6 +103,14 @@ void RestartPinLock(ModelState& state) {
 }
 
 const Subsystem& PinLockSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("OPModePinCodeLockState"), GetLockState},
+        {OLESTR("Set"), OLESTR("LockOPModePinCode"), Lock},
+        {OLESTR("Set"), OLESTR("UnlockOPModePinCode"), Unlock},
+    };
+    static constexpr EventRow kEvents[] = {
+        {OLESTR("OPModePinCodeLockState"), EventStyle::Value, LockStateEvent},
+    };
     static constexpr Subsystem subsystem{kRows, kEvents};
     return subsystem;
 }

@@ -49,7 +49,7 @@ struct Configuration {
 };
 
 constexpr std::size_t kDateRoom = 38;
-constexpr std::size_t kNameRoom = 63;
+constexpr std::size_t kConfigurationNameRoom = 63;
 
 // A robot's axes, speeds and flange as the safety controller saw them.
 struct Pose {
@@ -167,10 +167,6 @@ TextView LoadStatus(const SafetyState& safety) {
 // "-modestat active": the reply and the event "SafetyModeStatus".
 Text SafetyModeText(const ModelState& state) {
     return Concat({OLESTR("-modestat "), SafetyModeWord(state.Part<SafetyState>().mode)});
-}
-
-Reply Refused(TextView command, HRESULT status, TextView why) {
-    return Refuse(status, Concat({command, OLESTR(": "), why}));
 }
 
 Text Hex(const std::array<std::uint8_t, 32>& bytes) {
@@ -297,7 +293,7 @@ std::variant<Configuration, Text> ReadConfiguration(const FileSystem& files, Tex
     const auto version = ManifestValue(files, path, "version");
     const auto createdBy = ManifestValue(files, path, "createdby");
     const auto created = ManifestValue(files, path, "created");
-    if (!name || !Fits(*name, kNameRoom) || !createdBy || !Fits(*createdBy, kNameRoom) || !created ||
+    if (!name || !Fits(*name, kConfigurationNameRoom) || !createdBy || !Fits(*createdBy, kConfigurationNameRoom) || !created ||
         !Fits(*created, kDateRoom)) {
         return Text(OLESTR("lacks a usable name=, createdby= (1 to 63 characters) or created= (1 to 38) line"));
     }
@@ -329,7 +325,7 @@ std::variant<Configuration, Text> ReadConfiguration(const FileSystem& files, Tex
 std::optional<Text> NameArgument(const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto name = arguments ? arguments->Find(OLESTR("-Name")) : std::nullopt;
-    if (!name || !Fits(*name, kNameRoom)) {
+    if (!name || !Fits(*name, kConfigurationNameRoom)) {
         return std::nullopt;
     }
     return Text(*name);
@@ -365,11 +361,11 @@ Reply GetLoadStatus(ControllerModel& controller, const Command&) {
     }));
 }
 
-Reply GetMode(ControllerModel& controller, const Command&) {
+Reply GetSafetyMode(ControllerModel& controller, const Command&) {
     return Answer(controller.Read([](const ModelState& state) { return SafetyModeText(state); }));
 }
 
-Reply GetInfo(ControllerModel& controller, const Command&) {
+Reply GetSafetyConf(ControllerModel& controller, const Command&) {
     return controller.Read([](const ModelState& state) {
         const SafetyState& safety = state.Part<SafetyState>();
         return safety.inForce ? Answer(InfoText(*safety.inForce))
@@ -530,7 +526,7 @@ Reply LoadFile(ControllerModel& controller, const Command& command) {
     });
 }
 
-Reply Lock(ControllerModel& controller, const Command& command) {
+Reply LockConfiguration(ControllerModel& controller, const Command& command) {
     constexpr TextView kCommand = OLESTR("LockSupervConfig");
     const auto lock = [&](SafetyState& safety, Configuration& c, const Text& name, Text date) -> Reply {
         if (c.locked) {
@@ -552,7 +548,7 @@ Reply Lock(ControllerModel& controller, const Command& command) {
     return ChangeByName(controller, command, kCommand, lock);
 }
 
-Reply Unlock(ControllerModel& controller, const Command&) {
+Reply UnlockSupervision(ControllerModel& controller, const Command&) {
     constexpr TextView kCommand = OLESTR("VantorUnlockSuperv");
     return controller.Update([&](ModelState& state, EventPosts&) -> Reply {
         SafetyState& safety = state.Part<SafetyState>();
@@ -635,30 +631,8 @@ Reply GetPscUnits(ControllerModel& controller, const Command&) {
     }));
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("VantorConfigStatus"), GetConfigStatus},
-    {OLESTR("Get"), OLESTR("VantorLoadOperationStatus"), GetLoadStatus},
-    {OLESTR("Get"), OLESTR("SafetyModeStatus"), GetMode},
-    {OLESTR("Get"), OLESTR("SafetyConf"), GetInfo},
-    {OLESTR("Set"), OLESTR("SafetyConfValidated"), SetValidated},
-    {OLESTR("Set"), OLESTR("VantorNotValidated"), SetNotValidated},
-    {OLESTR("Set"), OLESTR("VantorSafetyMode"), SetMode},
-    {OLESTR("Set"), OLESTR("VantorReconfigure"), Reconfigure},
-    {OLESTR("Set"), OLESTR("VantorSyncSoftware"), SyncSoftware},
-    {OLESTR("Set"), OLESTR("VantorLoadSupervConfig"), LoadFile},
-    {OLESTR("Set"), OLESTR("LockSupervConfig"), Lock},
-    {OLESTR("Set"), OLESTR("VantorUnlockSuperv"), Unlock},
-    {OLESTR("Set"), OLESTR("ResetSafetyController"), FactoryReset},
-    {OLESTR("Get"), OLESTR("VantorViolationInfo"), GetViolation},
-    {OLESTR("Get"), OLESTR("PSCUnitStatus"), GetPscUnits},
-};
-
 // "SafetyModeStatus": the Get reply, "-modestat active" and so on.
-Text ModeEvent(const ModelState& state, const Arguments&) { return SafetyModeText(state); }
-
-constexpr EventRow kEvents[] = {
-    {OLESTR("SafetyModeStatus"), EventStyle::Value, ModeEvent},
-};
+Text SafetyModeEvent(const ModelState& state, const Arguments&) { return SafetyModeText(state); }
 
 // What each violation type puts in violation.
 using FlagsMember = Instances Violation::*;
@@ -707,6 +681,26 @@ bool TriggerSafetyViolation(ControllerModel& controller, int driveModule, TextVi
 }
 
 const Subsystem& SafetySubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("VantorConfigStatus"), GetConfigStatus},
+        {OLESTR("Get"), OLESTR("VantorLoadOperationStatus"), GetLoadStatus},
+        {OLESTR("Get"), OLESTR("SafetyModeStatus"), GetSafetyMode},
+        {OLESTR("Get"), OLESTR("SafetyConf"), GetSafetyConf},
+        {OLESTR("Set"), OLESTR("SafetyConfValidated"), SetValidated},
+        {OLESTR("Set"), OLESTR("VantorNotValidated"), SetNotValidated},
+        {OLESTR("Set"), OLESTR("VantorSafetyMode"), SetMode},
+        {OLESTR("Set"), OLESTR("VantorReconfigure"), Reconfigure},
+        {OLESTR("Set"), OLESTR("VantorSyncSoftware"), SyncSoftware},
+        {OLESTR("Set"), OLESTR("VantorLoadSupervConfig"), LoadFile},
+        {OLESTR("Set"), OLESTR("LockSupervConfig"), LockConfiguration},
+        {OLESTR("Set"), OLESTR("VantorUnlockSuperv"), UnlockSupervision},
+        {OLESTR("Set"), OLESTR("ResetSafetyController"), FactoryReset},
+        {OLESTR("Get"), OLESTR("VantorViolationInfo"), GetViolation},
+        {OLESTR("Get"), OLESTR("PSCUnitStatus"), GetPscUnits},
+    };
+    static constexpr EventRow kEvents[] = {
+        {OLESTR("SafetyModeStatus"), EventStyle::Value, SafetyModeEvent},
+    };
     static constexpr Subsystem subsystem{kRows, kEvents};
     return subsystem;
 }

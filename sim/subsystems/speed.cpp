@@ -34,21 +34,19 @@ Reply SetSpeedRatio(ControllerModel& controller, const Command& command) {
     return Done();
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("SpeedAdjust"), GetSpeedRatio},
-    {OLESTR("Set"), OLESTR("SpeedAdjust"), SetSpeedRatio},
-};
-
 // "SpeedAdjust": the same bare number as the Get reply ("75").
 Text SpeedEvent(const ModelState& state, const Arguments&) { return RatioText(state); }
-
-constexpr EventRow kEvents[] = {
-    {OLESTR("SpeedAdjust"), EventStyle::Value, SpeedEvent},
-};
 
 }  // namespace
 
 const Subsystem& SpeedSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("SpeedAdjust"), GetSpeedRatio},
+        {OLESTR("Set"), OLESTR("SpeedAdjust"), SetSpeedRatio},
+    };
+    static constexpr EventRow kEvents[] = {
+        {OLESTR("SpeedAdjust"), EventStyle::Value, SpeedEvent},
+    };
     static constexpr Subsystem subsystem{kRows, kEvents};
     return subsystem;
 }

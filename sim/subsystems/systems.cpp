@@ -219,21 +219,6 @@ Reply InstallNewSystem(ControllerModel& controller, const Command& command) {
     return controller.Update([&](ModelState& state, EventPosts&) { return InstallSystem(state, request); });
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("SystemName"), GetSystemName},
-    {OLESTR("Get"), OLESTR("SelectSystem"), GetSelectedSystem},
-    {OLESTR("Set"), OLESTR("SelectSystem"), SelectSystem},
-    {OLESTR("Set"), OLESTR("DeselectSystem"), DeselectSystem},
-    {OLESTR("Get"), OLESTR("SystemList"), GetSystemList},
-    {OLESTR("Set"), OLESTR("RemoveSystem"), RemoveSystem},
-    {OLESTR("Get"), OLESTR("BootDevice"), GetBootDevice},
-    {OLESTR("Set"), OLESTR("BootDevice"), SetBootDevice},
-    {OLESTR("Get"), OLESTR("SpannedFiles"), GetSpannedFiles},
-    {OLESTR("Set"), OLESTR("LoadBootImage"), LoadBootImage},
-    {OLESTR("Set"), OLESTR("UndoLoadBootImage"), UndoLoadBootImage},
-    {OLESTR("Set"), OLESTR("InstallNewSystem"), InstallNewSystem},
-};
-
 }  // namespace
 
 Text JoinPath(TextView folder, TextView name) {
@@ -393,6 +378,20 @@ void BootDeviceGone(ModelState& state, TextView device) {
 }
 
 const Subsystem& SystemsSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("SystemName"), GetSystemName},
+        {OLESTR("Get"), OLESTR("SelectSystem"), GetSelectedSystem},
+        {OLESTR("Set"), OLESTR("SelectSystem"), SelectSystem},
+        {OLESTR("Set"), OLESTR("DeselectSystem"), DeselectSystem},
+        {OLESTR("Get"), OLESTR("SystemList"), GetSystemList},
+        {OLESTR("Set"), OLESTR("RemoveSystem"), RemoveSystem},
+        {OLESTR("Get"), OLESTR("BootDevice"), GetBootDevice},
+        {OLESTR("Set"), OLESTR("BootDevice"), SetBootDevice},
+        {OLESTR("Get"), OLESTR("SpannedFiles"), GetSpannedFiles},
+        {OLESTR("Set"), OLESTR("LoadBootImage"), LoadBootImage},
+        {OLESTR("Set"), OLESTR("UndoLoadBootImage"), UndoLoadBootImage},
+        {OLESTR("Set"), OLESTR("InstallNewSystem"), InstallNewSystem},
+    };
     static constexpr Subsystem subsystem{kRows};
     return subsystem;
 }

@@ -22,7 +22,6 @@ constexpr std::array<TextView, 4> kReachableServers = {OLESTR("pool.ntp.org"), O
                                                        OLESTR("ntp.plant.local"), OLESTR("172.20.4.1")};
 
 bool IsLetter(OLECHAR c) { return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z'); }
-bool IsDigit(OLECHAR c) { return c >= '0' && c <= '9'; }
 
 // "hh" or "hh:mm", at most 14 hours.
 bool IsOffset(TextView text) {
@@ -161,15 +160,14 @@ Reply TestServer(ControllerModel& controller, const Command& command) {
     return Answer(ClockText(static_cast<std::uint32_t>(now.count())));
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("TimeZone"), GetZone},       {OLESTR("Set"), OLESTR("TimeZone"), SetZone},
-    {OLESTR("Get"), OLESTR("TimeServer"), GetServer},   {OLESTR("Set"), OLESTR("TimeServer"), SetServer},
-    {OLESTR("Set"), OLESTR("TestTimeServer"), TestServer},
-};
-
 }  // namespace
 
 const Subsystem& TimeSettingsSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("TimeZone"), GetZone},       {OLESTR("Set"), OLESTR("TimeZone"), SetZone},
+        {OLESTR("Get"), OLESTR("TimeServer"), GetServer},   {OLESTR("Set"), OLESTR("TimeServer"), SetServer},
+        {OLESTR("Set"), OLESTR("TestTimeServer"), TestServer},
+    };
     static constexpr Subsystem subsystem{kRows};
     return subsystem;
 }

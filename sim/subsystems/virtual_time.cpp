@@ -57,17 +57,13 @@ void Rebase(VirtualTimeState& clock) {
 // Every reply carries the low 32 bits; the clock itself does not wrap.
 Text TimeText(std::uint64_t time) { return OLESTR("-time ") + Decimal(static_cast<std::uint32_t>(time)); }
 
-Reply BadArguments(const Command& command, TextView expected) {
-    return Refuse(kStatusBadArgument, Text(command.name) + OLESTR(": expected ") + Text(expected) + OLESTR(", got ") +
-                                          Quoted(command.args));
-}
 
 std::optional<std::uint32_t> ValueOf(const Command& command, TextView key) {
     const auto arguments = Arguments::Parse(command.args);
     return arguments ? arguments->Unsigned(key) : std::nullopt;
 }
 
-Reply GetState(ControllerModel& controller, const Command&) {
+Reply GetVtState(ControllerModel& controller, const Command&) {
     const VtState state = controller.Read([](const ModelState& s) { return s.Part<VirtualTimeState>().state; });
     for (const VtWords& words : kVtWords) {
         if (words.state == state) {
@@ -77,7 +73,7 @@ Reply GetState(ControllerModel& controller, const Command&) {
     return Refuse(E_UNEXPECTED, OLESTR("VTState: the clock is in no known state"));
 }
 
-Reply SetState(ControllerModel& controller, const Command& command) {
+Reply SetVtState(ControllerModel& controller, const Command& command) {
     const TextView word = Trim(command.args);
     for (const VtWords& words : kVtWords) {
         if (words.command == word) {
@@ -149,20 +145,19 @@ Reply SetSpeed(ControllerModel& controller, const Command& command) {
     return Done();
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("VTState"), GetState},
-    {OLESTR("Set"), OLESTR("VTState"), SetState},
-    {OLESTR("Get"), OLESTR("VTTimeSlice"), GetTimeSlice},
-    {OLESTR("Set"), OLESTR("VTTimeSlice"), SetTimeSlice},
-    {OLESTR("Get"), OLESTR("VTTime"), GetTime},
-    {OLESTR("Set"), OLESTR("VTRun"), Run},
-    {OLESTR("Get"), OLESTR("VTSpeed"), GetSpeed},
-    {OLESTR("Set"), OLESTR("VTSpeed"), SetSpeed},
-};
-
 }  // namespace
 
 const Subsystem& VirtualTimeSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("VTState"), GetVtState},
+        {OLESTR("Set"), OLESTR("VTState"), SetVtState},
+        {OLESTR("Get"), OLESTR("VTTimeSlice"), GetTimeSlice},
+        {OLESTR("Set"), OLESTR("VTTimeSlice"), SetTimeSlice},
+        {OLESTR("Get"), OLESTR("VTTime"), GetTime},
+        {OLESTR("Set"), OLESTR("VTRun"), Run},
+        {OLESTR("Get"), OLESTR("VTSpeed"), GetSpeed},
+        {OLESTR("Set"), OLESTR("VTSpeed"), SetSpeed},
+    };
     static constexpr Subsystem subsystem{kRows};
     return subsystem;
 }

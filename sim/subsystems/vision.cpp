@@ -42,7 +42,7 @@ constexpr std::uint32_t kCameraMask = 0xFFFFFF00u;
 constexpr std::uint32_t kCameraGateway = kCameraNetwork | 1;
 constexpr std::uint32_t kFirstLease = kCameraNetwork | 100;
 
-constexpr std::size_t kNameRoom = 32;   // what a client may send
+constexpr std::size_t kCameraNameRoom = 32;   // what a client may send
 constexpr std::size_t kFieldRoom = 40;  // what a client reads of a reply field
 
 Camera Delivered(TextView mac, TextView name, CameraState state, std::uint32_t host, bool dhcp) {
@@ -150,8 +150,6 @@ TextView InfoStatusWord(CameraState state) {
     return OLESTR("Unknown");
 }
 
-constexpr TextView kUnspecified = OLESTR("unspec");
-
 Text OrUnspecified(const std::optional<std::uint32_t>& address) {
     return address ? Ipv4Text(*address) : Text(kUnspecified);
 }
@@ -201,9 +199,7 @@ TextView StatusWord(CameraState state) {
     return state == CameraState::Program ? TextView(OLESTR("Standby")) : InfoStatusWord(state);
 }
 
-Reply Refused(const Command& command, HRESULT status, TextView why) {
-    return Refuse(status, Concat({command.name, OLESTR(": "), why}));
-}
+Reply Refused(const Command& command, HRESULT status, TextView why) { return sim::Refused(command.name, status, why); }
 
 // What a command needs of its camera.
 enum class Needs {
@@ -305,7 +301,7 @@ bool IsWord(TextView text, std::size_t room) {
 }
 
 bool IsCameraName(TextView name) {
-    if (name.empty() || name.size() > kNameRoom || name == kUnspecified) {
+    if (name.empty() || name.size() > kCameraNameRoom || name == kUnspecified) {
         return false;
     }
     for (OLECHAR c : name) {
@@ -382,7 +378,7 @@ Reply Rename(ControllerModel& controller, const Command& command) {
 }
 
 // "-State 1" program, "-State 2" running.
-Reply SetState(ControllerModel& controller, const Command& command) {
+Reply SetCameraState(ControllerModel& controller, const Command& command) {
     return ChangeCamera(controller, command, OLESTR("-Camera"), Needs::Configured,
                     [&](VisionState&, Camera& camera, const Arguments& arguments, std::size_t) -> Reply {
                         const auto number = arguments.Unsigned(OLESTR("-State"));
@@ -507,24 +503,6 @@ Reply Refresh(ControllerModel& controller, const Command&) {
     return Done();
 }
 
-constexpr CommandRow kRows[] = {
-    {OLESTR("Get"), OLESTR("LMIsCameraValid"), IsValid},
-    {OLESTR("Get"), OLESTR("LMCameraStatus"), Status},
-    {OLESTR("Get"), OLESTR("LMNumberOfCameras"), Count},
-    {OLESTR("Set"), OLESTR("LMCameraName"), Rename},
-    {OLESTR("Set"), OLESTR("LMRefreshCameras"), Refresh},
-    {OLESTR("Get"), OLESTR("LMCameraInfoUsingIndex"), Info<Grammar::ByIndex>},
-    {OLESTR("Get"), OLESTR("LMCameraInfo"), Info<Grammar::ByName>},
-    {OLESTR("Get"), OLESTR("LMCameraInfoUsingIndex2"), Info<Grammar::ByIndex2>},
-    {OLESTR("Get"), OLESTR("LMCameraInfo2"), Info<Grammar::ByName2>},
-    {OLESTR("Set"), OLESTR("LMCameraState"), SetState},
-    {OLESTR("Set"), OLESTR("LMCameraIPSettings"), SetIp},
-    {OLESTR("Set"), OLESTR("LMCameraDHCP"), SetDhcp},
-    {OLESTR("Set"), OLESTR("LMCameraDNSSettings"), SetDns},
-    {OLESTR("Set"), OLESTR("LMFlashCameraLED"), Flash},
-    {OLESTR("Set"), OLESTR("LMUserCredentials"), SetCredentials},
-};
-
 }  // namespace
 
 bool PlugCamera(ControllerModel& controller, TextView macText) {
@@ -578,6 +556,23 @@ bool UnplugCamera(ControllerModel& controller, TextView macText) {
 }
 
 const Subsystem& VisionSubsystem() {
+    static constexpr CommandRow kRows[] = {
+        {OLESTR("Get"), OLESTR("LMIsCameraValid"), IsValid},
+        {OLESTR("Get"), OLESTR("LMCameraStatus"), Status},
+        {OLESTR("Get"), OLESTR("LMNumberOfCameras"), Count},
+        {OLESTR("Set"), OLESTR("LMCameraName"), Rename},
+        {OLESTR("Set"), OLESTR("LMRefreshCameras"), Refresh},
+        {OLESTR("Get"), OLESTR("LMCameraInfoUsingIndex"), Info<Grammar::ByIndex>},
+        {OLESTR("Get"), OLESTR("LMCameraInfo"), Info<Grammar::ByName>},
+        {OLESTR("Get"), OLESTR("LMCameraInfoUsingIndex2"), Info<Grammar::ByIndex2>},
+        {OLESTR("Get"), OLESTR("LMCameraInfo2"), Info<Grammar::ByName2>},
+        {OLESTR("Set"), OLESTR("LMCameraState"), SetCameraState},
+        {OLESTR("Set"), OLESTR("LMCameraIPSettings"), SetIp},
+        {OLESTR("Set"), OLESTR("LMCameraDHCP"), SetDhcp},
+        {OLESTR("Set"), OLESTR("LMCameraDNSSettings"), SetDns},
+        {OLESTR("Set"), OLESTR("LMFlashCameraLED"), Flash},
+        {OLESTR("Set"), OLESTR("LMUserCredentials"), SetCredentials},
+    };
     static constexpr Subsystem subsystem{kRows};
     return subsystem;
 }
