@@ -11,9 +11,9 @@
 namespace tav {
 namespace {
 
-class ControllerInterfaces final : public ControllerObject {
+class GuardedController final : public ControllerObject {
 public:
-    ControllerInterfaces(LONG version, IUnknown* outer) : ControllerObject(version, outer) {}
+    GuardedController(LONG version, IUnknown* outer) : ControllerObject(version, outer) {}
 
 #define TAV_CONTROLLER_METHOD(interface_, name, params, args) \
     HRESULT STDMETHODCALLTYPE name params override try {      \
@@ -28,7 +28,7 @@ public:
 }  // namespace
 
 ControllerObject* ControllerObject::Allocate(LONG version, IUnknown* outer) {
-    return new (std::nothrow) ControllerInterfaces(version, outer);
+    return new (std::nothrow) GuardedController(version, outer);
 }
 
 }  // namespace tav

@@ -21,7 +21,7 @@ constexpr ControllerPathTexts kVersionPathTexts{
 constexpr WordValue<TavBackupEvent> kEventWords[] = {{OLESTR("Finished"), BackupEvent_Finished},
                                                      {OLESTR("Error"), BackupEvent_Error}};
 
-constexpr WordValue<TavBackupState> kStateWords[] = {{OLESTR("None"), BackupState_None},
+constexpr WordValue<TavBackupState> kBackupStateWords[] = {{OLESTR("None"), BackupState_None},
                                                      {OLESTR("InProgress"), BackupState_InProgress}};
 
 }  // namespace
@@ -56,7 +56,7 @@ HRESULT ControllerObject::UnpackBackupState(VARIANT* data, TavBackupState* state
             if (text::Scan<OLESTR("-BackupState %11s")>(reply.Text(), word) != 1) {
                 return reply.Fail(E_FAIL, OLESTR("Failed to fetch state"));
             }
-            const std::optional<TavBackupState> value = FindWord(OleStringView(word), kStateWords);
+            const std::optional<TavBackupState> value = FindWord(OleStringView(word), kBackupStateWords);
             if (!value) {
                 return reply.Fail(E_FAIL, OLESTR("Unsupported state"));
             }

@@ -6,7 +6,7 @@
 namespace tav {
 namespace {
 
-constexpr WordValue<TavSysInboxState> kStateWords[] = {{OLESTR("error"), TavSysInbox_Error},
+constexpr WordValue<TavSysInboxState> kInboxStateWords[] = {{OLESTR("error"), TavSysInbox_Error},
                                                        {OLESTR("empty"), TavSysInbox_Empty},
                                                        {OLESTR("open"), TavSysInbox_Open},
                                                        {OLESTR("loaded"), TavSysInbox_Loaded},
@@ -71,7 +71,7 @@ HRESULT UnpackSysInboxState(ControllerObject& object, VARIANT* data, TavSysInbox
         .OutPointer(state, OLESTR("UnpackSysInboxState. Invalid out pointer"))
         .IsBstr(OLESTR("UnpackSysInboxState. Data-variant not of type VT_BSTR"))
         .Fields<OLESTR("-state %16s")>(OLESTR("UnpackSysInboxState failed."),
-                                       fields::MappedOr<TavSysInboxState>{state, kStateWords, TavSysInbox_Undefined});
+                                       fields::MappedOr<TavSysInboxState>{state, kInboxStateWords, TavSysInbox_Undefined});
 }
 
 // Busy is exactly "true"; anything else is not busy.

@@ -9,9 +9,9 @@
 namespace tav {
 namespace {
 
-constexpr LONG kRetrieveAll = -2;
+constexpr LONG kDevicesRetrieveAll = -2;
 
-constexpr WordValue<TavStorageDeviceType> kTypeWords[] = {{OLESTR("Unknown"), StorageDeviceType_Unknown},
+constexpr WordValue<TavStorageDeviceType> kDeviceTypeWords[] = {{OLESTR("Unknown"), StorageDeviceType_Unknown},
                                                           {OLESTR("Removable"), StorageDeviceType_Removable},
                                                           {OLESTR("Ramdisk"), StorageDeviceType_Ramdisk},
                                                           {OLESTR("Remote"), StorageDeviceType_Remote},
@@ -54,7 +54,7 @@ ElementRead ReadDevice(Reply& reply, OleStringView rest, TavStorageDevice& devic
                                                          &consumed) != 4) {
         return ElementRead::Mismatch();
     }
-    device.deviceType = WordOr(OleStringView(type), kTypeWords, StorageDeviceType_Unknown);
+    device.deviceType = WordOr(OleStringView(type), kDeviceTypeWords, StorageDeviceType_Unknown);
     if (FAILED(reply.Allocate(OleStringView(name), &device.deviceName))) {
         return {reply.Result(), 0};
     }
@@ -69,7 +69,7 @@ ElementRead ReadDevice(Reply& reply, OleStringView rest, TavStorageDevice2& devi
                                                             &device.bShowDevice, &consumed) != 5) {
         return ElementRead::Mismatch();
     }
-    device.deviceType = WordOr(OleStringView(type), kTypeWords, StorageDeviceType_Unknown);
+    device.deviceType = WordOr(OleStringView(type), kDeviceTypeWords, StorageDeviceType_Unknown);
     if (FAILED(reply.Allocate(OleStringView(name), &device.deviceName))) {
         return {reply.Result(), 0};
     }
@@ -110,7 +110,7 @@ HRESULT ControllerObject::GetStorageDevices(TavInParams* rip, TavRetrievalParams
         .Initialised(OLESTR("Helper used before initialized."))
         .OutPointers(OLESTR(""), retrieval, devices)
         .Clear(devices)
-        .Require([&] { return retrieval->noOfElts == kRetrieveAll; }, E_INVALIDARG,
+        .Require([&] { return retrieval->noOfElts == kDevicesRetrieveAll; }, E_INVALIDARG,
                  OLESTR("GetStorageDevice - Only the RetrieveAll retrieval mode is supported."))
         .Get(OLESTR("StorageDevice"))
         .Decode([&](VARIANT* reply) { return UnpackStorageDevices(reply, retrieval, devices); });
@@ -137,7 +137,7 @@ HRESULT ControllerObject::GetStorageDevices2(TavInParams* rip, TavRetrievalParam
         .Initialised(OLESTR("Helper used before initialized."))
         .OutPointers(OLESTR(""), retrieval, devices)
         .Clear(devices)
-        .Require([&] { return retrieval->noOfElts == kRetrieveAll; }, E_INVALIDARG,
+        .Require([&] { return retrieval->noOfElts == kDevicesRetrieveAll; }, E_INVALIDARG,
                  OLESTR("GetStorageDevice - Only the RetrieveAll retrieval mode is supported."))
         .Get(OLESTR("StorageDevice2"))
         .Decode([&](VARIANT* reply) { return UnpackStorageDevices2(reply, retrieval, devices); });

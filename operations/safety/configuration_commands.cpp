@@ -4,13 +4,10 @@
 // local one.
 #include "core/controller_object.h"
 #include "core/text/format.h"
+#include "operations/safety/safety_mode_words.h"
 
 namespace tav {
 namespace {
-
-constexpr WordValue<TavVantorSafetyMode> kModeWords[] = {{OLESTR("active"), VantorSafetyModeActiveMode},
-                                                         {OLESTR("commissioning"), VantorSafetyModeCommissioningMode},
-                                                         {OLESTR("service"), VantorSafetyModeServiceMode}};
 
 // Where a local configuration file is put on the controller before it is loaded.
 constexpr OleStringView kUploadDirectory = OLESTR("/hd0a/temp/safety");
@@ -51,7 +48,7 @@ HRESULT ControllerObject::SetSafetyConfigurationNotValidated(TavInParams* rip) {
 }
 
 HRESULT ControllerObject::SetSafetyMode(TavInParams* rip, TavVantorSafetyMode mode) {
-    const OLECHAR* word = WordOf(mode, kModeWords);
+    const OLECHAR* word = WordOf(mode, kSafetyModeWords);
     return Command(rip)
         .ValidParams(OLESTR("SetSafetyMode: Invalid TavInParams"))
         .Initialised(OLESTR("TavController used before Initialized"))

@@ -8,7 +8,7 @@
 namespace tav {
 namespace {
 
-constexpr LONG kRetrieveAll = -2;
+constexpr LONG kUnitsRetrieveAll = -2;
 
 constexpr ListTexts kUnitListTexts{OLESTR(""), OLESTR("UnpackPSCUnitStatus. Could not parse out element: %s"),
                                    OLESTR("UnpackPSCUnitStatus. Can't create enum object!"),
@@ -26,7 +26,7 @@ HRESULT ControllerObject::GetPSCUnitStatus(TavInParams* rip, TavRetrievalParams*
         .Initialised(OLESTR("Helper used before initialized."))
         .OutPointers(OLESTR(""), retrieval, units)
         .Clear(units)
-        .Require([&] { return retrieval->noOfElts == kRetrieveAll; }, E_INVALIDARG,
+        .Require([&] { return retrieval->noOfElts == kUnitsRetrieveAll; }, E_INVALIDARG,
                  OLESTR("GetPSCUnitStatus - Only the RetrieveAll retrieval mode is supported."))
         .Get(OLESTR("PSCUnitStatus"))
         .Decode([&](VARIANT* reply) { return UnpackPSCUnitStatus(reply, retrieval, units); });

@@ -3,6 +3,7 @@
 // later reads as the default, which differs on purpose: an unknown load
 // status is a refusal, an unknown configuration or mode an error.
 #include "core/controller_object.h"
+#include "operations/safety/safety_mode_words.h"
 
 namespace tav {
 namespace {
@@ -14,10 +15,6 @@ constexpr WordValue<TavVantorConfigStatus> kConfigWords[] = {{OLESTR("loaded"), 
 
 constexpr WordValue<TavVantorLoadConfigStatus> kLoadWords[] = {{OLESTR("ok"), VantorLoadConfigPermitted},
                                                                {OLESTR("error"), VantorLoadConfigError}};
-
-constexpr WordValue<TavVantorSafetyMode> kModeWords[] = {{OLESTR("active"), VantorSafetyModeActiveMode},
-                                                         {OLESTR("commissioning"), VantorSafetyModeCommissioningMode},
-                                                         {OLESTR("service"), VantorSafetyModeServiceMode}};
 
 }  // namespace
 
@@ -77,7 +74,7 @@ HRESULT ControllerObject::UnpackSafetyModeStatus(VARIANT* data, TavVantorSafetyM
         .OutPointers(OLESTR("UnpackSafetyModeStatus. Invalid out pointer"), status)
         .IsBstr(OLESTR("UnpackSafetyModeStatus. Invalid argument."))
         .Fields<OLESTR("-modestat %40s")>(OLESTR("UnpackSafetyModeStatus failed."),
-                                          fields::MappedOr<TavVantorSafetyMode>{status, kModeWords,
+                                          fields::MappedOr<TavVantorSafetyMode>{status, kSafetyModeWords,
                                                                                 VantorSafetyModeError});
 }
 

@@ -14,7 +14,7 @@
 namespace tav {
 namespace {
 
-constexpr WordValue<TavVantorViolationType> kTypeWords[] = {
+constexpr WordValue<TavVantorViolationType> kViolationTypeWords[] = {
     {OLESTR("none"), TavVantorViolationTypeNone},
     {OLESTR("stz"), TavVantorViolationTypeSTZ},
     {OLESTR("sar"), TavVantorViolationTypeSAR},
@@ -127,7 +127,7 @@ HRESULT ControllerObject::UnpackSafetyViolationStatus(
             const HRESULT head = reply.Fields<OLESTR(
                 "-vnumber %d -violationtype %s -instanceid %d -isunsync %d -tool %d -drive %d")>(
                 OLESTR("UnpackLastSafetyViolation failed."), number,
-                fields::MappedOr<TavVantorViolationType>{type, kTypeWords, TavVantorViolationTypeUndefined},
+                fields::MappedOr<TavVantorViolationType>{type, kViolationTypeWords, TavVantorViolationTypeUndefined},
                 instance, synchronized, tool, drive);
             if (FAILED(head)) {
                 return head;

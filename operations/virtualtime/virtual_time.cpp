@@ -8,7 +8,7 @@ namespace tav {
 namespace {
 
 // The set command carries the state with its "VT" prefix, the reply without.
-constexpr WordValue<TavVTState> kStateWords[] = {{OLESTR("VTStop"), VTStop},
+constexpr WordValue<TavVTState> kVtStateWords[] = {{OLESTR("VTStop"), VTStop},
                                                  {OLESTR("VTFreeRun"), VTFreeRun},
                                                  {OLESTR("VTRunSlice"), VTRunSlice},
                                                  {OLESTR("VTNextEvent"), VTNextEvent}};
@@ -30,7 +30,7 @@ HRESULT ControllerObject::VTGetState(TavInParams* rip, TavVTState* state) {
 }
 
 HRESULT ControllerObject::VTSetState(TavInParams* rip, TavVTState state) {
-    const OLECHAR* word = WordOf(state, kStateWords);
+    const OLECHAR* word = WordOf(state, kVtStateWords);
     return Command(rip)
         .ValidParams(OLESTR("VTSetState: Invalid TavInParams"))
         .Initialised(OLESTR("VTSetState. Helper used before initialized."))
