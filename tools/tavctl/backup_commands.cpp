@@ -34,7 +34,7 @@ int Start(Verb& v) {
     return v.Set("Backup", &B::Backup, path.Get());
 }
 
-int State(Verb& v) {
+int BackupState(Verb& v) {
     v.End();
     return v.Get("GetBackupState", &B::GetBackupState, &B::UnpackBackupState);
 }
@@ -97,7 +97,7 @@ constexpr const char* kRestoreDetails =
 
 constexpr VerbEntry kBackup[] = {
     {"start", "PATH", "start a backup into a controller folder (Backup)", Start},
-    {"state", "", "print whether a backup runs (GetBackupState)", State},
+    {"state", "", "print whether a backup runs (GetBackupState)", BackupState},
     {"check", "PATH [--include I] [--ignore M] [--settings N]", "check that a backup can be restored (CheckRestore)",
      Check, kRestoreDetails},
     {"restore", "PATH [--include I] [--ignore M] [--settings N] [--delete]", "restore a backup (Restore)", Restore,
@@ -107,10 +107,11 @@ constexpr VerbEntry kBackup[] = {
     {"decompress", "FILE DESTINATION", "decompress a file on the controller (Decompress)", Decompress},
 };
 
-constexpr GroupEntry kGroups[] = {{"backup", "Backup and restore", kBackup}};
-
 }  // namespace
 
-std::span<const GroupEntry> BackupGroups() { return kGroups; }
+std::span<const GroupEntry> BackupGroups() {
+    static constexpr GroupEntry kGroups[] = {{"backup", "Backup and restore", kBackup}};
+    return kGroups;
+}
 
 }  // namespace tavctl

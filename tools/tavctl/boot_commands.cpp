@@ -174,14 +174,15 @@ constexpr VerbEntry kInbox[] = {
     {"upgrade", "FOLDER", "upgrade the boot server (UpgradeBootServer)", InboxUpgrade},
 };
 
-constexpr GroupEntry kGroups[] = {
-    {"system", "Installed controller systems", kSystem},
-    {"boot", "The boot device and image", kBoot},
-    {"inbox", "The installation inbox", kInbox},
-};
-
 }  // namespace
 
-std::span<const GroupEntry> BootGroups() { return kGroups; }
+std::span<const GroupEntry> BootGroups() {
+    static constexpr GroupEntry kGroups[] = {
+        {"system", "Installed controller systems", kSystem},
+        {"boot", "The boot device and image", kBoot},
+        {"inbox", "The installation inbox", kInbox},
+    };
+    return kGroups;
+}
 
 }  // namespace tavctl

@@ -62,13 +62,14 @@ constexpr VerbEntry kRestart[] = {
      "p i x s b); a number is passed on as it is.\n"},
 };
 
-constexpr GroupEntry kGroups[] = {
-    {"clock", "The controller clock, in UTC", kClock},
-    {"restart", "Restarting the controller", kRestart},
-};
-
 }  // namespace
 
-std::span<const GroupEntry> ClockGroups() { return kGroups; }
+std::span<const GroupEntry> ClockGroups() {
+    static constexpr GroupEntry kGroups[] = {
+        {"clock", "The controller clock, in UTC", kClock},
+        {"restart", "Restarting the controller", kRestart},
+    };
+    return kGroups;
+}
 
 }  // namespace tavctl

@@ -93,7 +93,7 @@ int DumpStatus(Verb& v) {
 // No operation of the module lists a folder, so this looks at the embedded
 // virtual controller's disks directly; a controller named by --url alone
 // cannot be looked into.
-int List(Verb& v) {
+int DeviceList(Verb& v) {
     const std::string path = v.OptionalWord().value_or("/");
     v.End();
     const auto controller = v.session.Options().embedded ? tav::sim::ControllerAt(ToOle(v.session.Options().url))
@@ -146,20 +146,21 @@ constexpr VerbEntry kScreenDump[] = {
     {"status", "", "print the result of the last screen dump (GetDorvelScreenDumpStatus)", DumpStatus},
 };
 constexpr VerbEntry kList[] = {
-    {"", "[PATH]", "list a folder of the embedded virtual controller's disks", List,
+    {"", "[PATH]", "list a folder of the embedded virtual controller's disks", DeviceList,
      "The module has no operation that lists a folder; ls reads the embedded\n"
      "virtual controller's disks (hd0a, usb1, ...) directly.\n"}};
 
-constexpr GroupEntry kGroups[] = {
-    {"devices", "Storage devices", kDevices},
-    {"copy", "Copying files and folders on the controller", kCopy},
-    {"diag", "Diagnostics information", kDiag},
-    {"screendump", "The pendant screen dump", kScreenDump},
-    {"ls", "The embedded controller's disks", kList},
-};
-
 }  // namespace
 
-std::span<const GroupEntry> DeviceGroups() { return kGroups; }
+std::span<const GroupEntry> DeviceGroups() {
+    static constexpr GroupEntry kGroups[] = {
+        {"devices", "Storage devices", kDevices},
+        {"copy", "Copying files and folders on the controller", kCopy},
+        {"diag", "Diagnostics information", kDiag},
+        {"screendump", "The pendant screen dump", kScreenDump},
+        {"ls", "The embedded controller's disks", kList},
+    };
+    return kGroups;
+}
 
 }  // namespace tavctl

@@ -346,10 +346,11 @@ constexpr VerbEntry kWatch[] = {
     {"stop", "", "unsubscribe", WatchStop},
 };
 
-constexpr GroupEntry kGroups[] = {{"watch", "Controller events", kWatch}};
-
 }  // namespace
 
-std::span<const GroupEntry> EventGroups() { return kGroups; }
+std::span<const GroupEntry> EventGroups() {
+    static constexpr GroupEntry kGroups[] = {{"watch", "Controller events", kWatch}};
+    return kGroups;
+}
 
 }  // namespace tavctl

@@ -128,22 +128,23 @@ constexpr VerbEntry kError[] = {{"", "",
                                 "after a failing command",
                                 LastError}};
 
-constexpr GroupEntry kGroups[] = {
-    {"name", "The controller's name", kName},
-    {"id", "The controller identifier", kId},
-    {"language", "The controller's language", kLanguage},
-    {"guid", "The system GUID", kGuid},
-    {"env", "Environment variables of the controller", kEnvironment},
-    {"option", "Installed options", kOption},
-    {"clients", "Connected API clients", kClients},
-    {"energy", "The system energy state", kEnergy},
-    {"link", "The file transfer link", kLink},
-    {"version", "Version information", kVersion},
-    {"error", "The object's last-error text", kError},
-};
-
 }  // namespace
 
-std::span<const GroupEntry> IdentityGroups() { return kGroups; }
+std::span<const GroupEntry> IdentityGroups() {
+    static constexpr GroupEntry kGroups[] = {
+        {"name", "The controller's name", kName},
+        {"id", "The controller identifier", kId},
+        {"language", "The controller's language", kLanguage},
+        {"guid", "The system GUID", kGuid},
+        {"env", "Environment variables of the controller", kEnvironment},
+        {"option", "Installed options", kOption},
+        {"clients", "Connected API clients", kClients},
+        {"energy", "The system energy state", kEnergy},
+        {"link", "The file transfer link", kLink},
+        {"version", "Version information", kVersion},
+        {"error", "The object's last-error text", kError},
+    };
+    return kGroups;
+}
 
 }  // namespace tavctl

@@ -10,14 +10,14 @@
 namespace tavctl {
 namespace {
 
-using Info = ITavIPCInformation;
+using IpcInfo = ITavIPCInformation;
 
 // A slot by its id, or by its name through GetSlotId.
 short SlotArgument(Verb& v, const char* what, const std::string& word) {
     if (!word.empty() && (std::isdigit(static_cast<unsigned char>(word[0])) || word[0] == '-')) {
         return v.NumberFrom<short>(what, word);
     }
-    const auto info = v.Interface<Info>();
+    const auto info = v.Interface<IpcInfo>();
     const tav::Bstr name = Verb::ToBstr(word);
     short id = 0;
     TavInParams rip = v.session.SyncParams();
@@ -116,7 +116,7 @@ int Receive(Verb& v) {
 
 int Slots(Verb& v) {
     v.End();
-    const auto info = v.Interface<Info>();
+    const auto info = v.Interface<IpcInfo>();
     return ReadList<IEnumSlots, TavIPCSlot>(
         v, "GetSlotInformation", -1,
         [&](TavInParams* rip, TavRetrievalParams* params, IEnumSlots** slots) {
@@ -139,18 +139,18 @@ int Slots(Verb& v) {
 int SlotName(Verb& v) {
     const short slot = v.Number<short>("ID");
     v.End();
-    return v.GetOnly("GetSlotName", &Info::GetSlotName, slot);
+    return v.GetOnly("GetSlotName", &IpcInfo::GetSlotName, slot);
 }
 
 int SlotId(Verb& v) {
     const auto name = v.Text("NAME");
     v.End();
-    return v.GetOnly("GetSlotId", &Info::GetSlotId, name.Get());
+    return v.GetOnly("GetSlotId", &IpcInfo::GetSlotId, name.Get());
 }
 
 int Sizes(Verb& v) {
     v.End();
-    const auto info = v.Interface<Info>();
+    const auto info = v.Interface<IpcInfo>();
     LONG message = 0;
     LONG package = 0;
     TavInParams rip = v.session.SyncParams();
@@ -248,10 +248,11 @@ constexpr VerbEntry kIpc[] = {
      "send N messages to the echo slot and print the round-trip rate and latency percentiles", Ping},
 };
 
-constexpr GroupEntry kGroups[] = {{"ipc", "Inter-process message slots", kIpc}};
-
 }  // namespace
 
-std::span<const GroupEntry> IpcGroups() { return kGroups; }
+std::span<const GroupEntry> IpcGroups() {
+    static constexpr GroupEntry kGroups[] = {{"ipc", "Inter-process message slots", kIpc}};
+    return kGroups;
+}
 
 }  // namespace tavctl

@@ -67,7 +67,7 @@ int Set(Verb& v) {
     return v.Set("SetLANAdaptorIP", &Lan2::SetLANAdaptorIP, method, address.Get(), mask.Get(), gateway.Get());
 }
 
-int Info(Verb& v) {
+int LanInfo(Verb& v) {
     v.End();
     const auto lan = v.Interface<Lan>();
     tav::Bstr address, mask, gateway, mac;
@@ -123,7 +123,7 @@ constexpr VerbEntry kLan[] = {
      "set the IP settings (SetLANAdaptorIP; without --method SetLANAdaptorIPConfig)", Set,
      "Example: tavctl lan set --method FIXIP --address 192.168.125.1 --mask\n"
      "255.255.255.0 --gateway 192.168.125.254\n"},
-    {"info", "", "print the adaptor's current settings and MAC address (GetLANAdaptorInfo)", Info},
+    {"info", "", "print the adaptor's current settings and MAC address (GetLANAdaptorInfo)", LanInfo},
 };
 constexpr VerbEntry kTimeZone[] = {
     {"get", "", "print the time zone (GetTimeZone)", TimeZoneGet},

@@ -8,7 +8,7 @@
 namespace tavctl {
 namespace {
 
-constexpr EnumName kStateWords[] = {{MotorsOn, "on"}, {MotorsOff, "off"}};
+constexpr EnumName kMotorsStateWords[] = {{MotorsOn, "on"}, {MotorsOff, "off"}};
 constexpr EnumName kAcknowledgements[] = {{AutoAck, "auto"}, {ManfAck, "manf"}, {ColDetAck, "coldet"}};
 constexpr EnumName kConditionAnswers[] = {{AutoConditionAck_Reset, "reset"}, {AutoConditionAck_Keep, "keep"}};
 
@@ -22,7 +22,7 @@ int StateSet(Verb& v) {
     const std::string word = v.Word("STATE");
     v.End();
     const auto state = static_cast<TavControllerState>(v.EnumValue("STATE", word, NamesOf<TavControllerState>(),
-                                                                   kStateWords));
+                                                                   kMotorsStateWords));
     if (keyless) {
         return v.Set("SetControllerStateKeyLess", &ITavPanel3::SetControllerStateKeyLess, state);
     }
@@ -198,18 +198,19 @@ constexpr VerbEntry kPin[] = {
     {"state", "", "print the PIN lock state (GetOPModePinCodeLockState)", PinState},
 };
 
-constexpr GroupEntry kGroups[] = {
-    {"state", "The controller (motors) state", kState},
-    {"mode", "The operation mode", kMode},
-    {"collision", "Collision detection", kCollision},
-    {"ack", "Acknowledgements", kAck},
-    {"autocond", "Auto conditions", kAutoCondition},
-    {"speed", "The speed ratio", kSpeed},
-    {"pin", "The operator-mode PIN lock", kPin},
-};
-
 }  // namespace
 
-std::span<const GroupEntry> PanelGroups() { return kGroups; }
+std::span<const GroupEntry> PanelGroups() {
+    static constexpr GroupEntry kGroups[] = {
+        {"state", "The controller (motors) state", kState},
+        {"mode", "The operation mode", kMode},
+        {"collision", "Collision detection", kCollision},
+        {"ack", "Acknowledgements", kAck},
+        {"autocond", "Auto conditions", kAutoCondition},
+        {"speed", "The speed ratio", kSpeed},
+        {"pin", "The operator-mode PIN lock", kPin},
+    };
+    return kGroups;
+}
 
 }  // namespace tavctl

@@ -9,7 +9,7 @@ namespace {
 
 using S = ITavSafety;
 
-int Status(Verb& v) {
+int SafetyStatus(Verb& v) {
     v.End();
     return v.Get("GetConfigStatus", &S::GetConfigStatus, &S::UnpackConfigStatus);
 }
@@ -70,7 +70,7 @@ struct ConfigInfo {
     }
 };
 
-int Info(Verb& v) {
+int SafetyInfo(Verb& v) {
     v.End();
     const auto safety = v.Interface<S>();
     ConfigInfo info;
@@ -107,7 +107,7 @@ int Reconfigure(Verb& v) {
     v.End();
     return v.Set("Reconfigure", &S::Reconfigure);
 }
-int Sync(Verb& v) {
+int SyncSoftware(Verb& v) {
     const int module = v.Number<int>("DRIVE_MODULE");
     v.End();
     return v.Set("SyncSoftware", &S::SyncSoftware, module);
@@ -216,13 +216,13 @@ int Units(Verb& v) {
 }
 
 constexpr VerbEntry kSafety[] = {
-    {"status", "", "print the configuration status (GetConfigStatus)", Status},
+    {"status", "", "print the configuration status (GetConfigStatus)", SafetyStatus},
     {"load-status", "", "print whether loading a configuration is permitted (GetLoadOperationStatus)", LoadStatus},
     {"mode", "", "print the safety mode (GetSafeyModeStatus)", Mode},
     {"set-mode", "MODE", "set the safety mode (SetSafetyMode)", SetMode,
      "MODE: active, commissioning, service, a TavVantorSafetyMode name\n"
      "(VantorSafetyModeActiveMode, ...) or a number.\n"},
-    {"info", "", "print the configuration information (GetSafetyConfigurationInfo)", Info},
+    {"info", "", "print the configuration information (GetSafetyConfigurationInfo)", SafetyInfo},
     {"validate", "BY", "mark the configuration validated (SetSafetyConfigurationValidated)", Validate},
     {"unvalidate", "", "mark the configuration not validated (SetSafetyConfigurationNotValidated)", Unvalidate},
     {"lock", "BY", "lock the configuration (SetSafetyConfigurationLocked)", Lock},
@@ -234,7 +234,7 @@ constexpr VerbEntry kSafety[] = {
      "(instances 1 to 8, comma-separated). A loaded file is in force after\n"
      "'safety reconfigure'.\n"},
     {"reconfigure", "", "reconfigure the safety controller (Reconfigure)", Reconfigure},
-    {"sync", "DRIVE_MODULE", "synchronise a drive module's software (SyncSoftware)", Sync},
+    {"sync", "DRIVE_MODULE", "synchronise a drive module's software (SyncSoftware)", SyncSoftware},
     {"factory-reset", "", "reset to the factory defaults (ResetSafetyControllerToFactoryDefault)", FactoryReset},
     {"violation", "[--drive N] [--last]", "print the violation status (GetSafetyViolationStatus)", Violation,
      "--drive: the drive module (default 1); --last: the last violation. Up to 16\n"
@@ -242,13 +242,14 @@ constexpr VerbEntry kSafety[] = {
 };
 constexpr VerbEntry kPsc[] = {{"units", "", "list the units' status (GetPSCUnitStatus)", Units}};
 
-constexpr GroupEntry kGroups[] = {
-    {"safety", "The safety controller", kSafety},
-    {"psc", "Positional safety controller units", kPsc},
-};
-
 }  // namespace
 
-std::span<const GroupEntry> SafetyGroups() { return kGroups; }
+std::span<const GroupEntry> SafetyGroups() {
+    static constexpr GroupEntry kGroups[] = {
+        {"safety", "The safety controller", kSafety},
+        {"psc", "Positional safety controller units", kPsc},
+    };
+    return kGroups;
+}
 
 }  // namespace tavctl

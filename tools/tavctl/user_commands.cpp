@@ -173,15 +173,16 @@ constexpr VerbEntry kUas[] = {
     {"grants", "", "print the grants (GetGrantList)", GrantList},
 };
 
-constexpr GroupEntry kGroups[] = {
-    {"user", "Users", kUser},
-    {"rmmp", "Manual-mode privileges", kRmmp},
-    {"master", "Mastership", kMaster},
-    {"uas", "The user authorisation system", kUas},
-};
-
 }  // namespace
 
-std::span<const GroupEntry> UserGroups() { return kGroups; }
+std::span<const GroupEntry> UserGroups() {
+    static constexpr GroupEntry kGroups[] = {
+        {"user", "Users", kUser},
+        {"rmmp", "Manual-mode privileges", kRmmp},
+        {"master", "Mastership", kMaster},
+        {"uas", "The user authorisation system", kUas},
+    };
+    return kGroups;
+}
 
 }  // namespace tavctl

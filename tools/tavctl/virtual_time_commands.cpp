@@ -7,20 +7,20 @@ namespace {
 
 using VT = ITavVirtualTime;
 
-constexpr EnumName kStateWords[] = {
+constexpr EnumName kVtStateWords[] = {
     {VTStop, "stop"}, {VTFreeRun, "free"}, {VTRunSlice, "slice"}, {VTNextEvent, "next"}};
 
-int StateGet(Verb& v) {
+int VtStateGet(Verb& v) {
     v.End();
     return v.Get("VTGetState", &VT::VTGetState, &VT::UnpackVTState);
 }
-int StateSet(Verb& v) {
+int VtStateSet(Verb& v) {
     const std::string word = v.Word("STATE");
     v.End();
-    const auto state = static_cast<TavVTState>(v.EnumValue("STATE", word, NamesOf<TavVTState>(), kStateWords));
+    const auto state = static_cast<TavVTState>(v.EnumValue("STATE", word, NamesOf<TavVTState>(), kVtStateWords));
     return v.Set("VTSetState", &VT::VTSetState, state);
 }
-int State(Verb& v) { return v.Done() ? StateGet(v) : StateSet(v); }
+int VtState(Verb& v) { return v.Done() ? VtStateGet(v) : VtStateSet(v); }
 int SliceGet(Verb& v) {
     v.End();
     return v.GetOnly("VTGetTimeSlice", &VT::VTGetTimeSlice);
@@ -51,19 +51,20 @@ int Speed(Verb& v) {
 }
 
 constexpr VerbEntry kVirtualTime[] = {
-    {"state", "[STATE]", "print the virtual time state (VTGetState), or set it (VTSetState)", State,
+    {"state", "[STATE]", "print the virtual time state (VTGetState), or set it (VTSetState)", VtState,
      "STATE: VTStop (stop), VTFreeRun (free), VTRunSlice (slice), VTNextEvent (next).\n"},
-    {"set", "STATE", "set the virtual time state (VTSetState)", StateSet},
+    {"set", "STATE", "set the virtual time state (VTSetState)", VtStateSet},
     {"slice", "[MILLISECONDS]", "print the time slice (VTGetTimeSlice), or set it (VTSetTimeSlice)", Slice},
     {"time", "", "print the virtual time (VTGetTime)", Time},
     {"run", "", "run one slice (VTRun)", Run},
     {"speed", "[SPEED]", "print the speed (VTGetSpeed), or set it (VTSetSpeed)", Speed},
 };
 
-constexpr GroupEntry kGroups[] = {{"vt", "Virtual time", kVirtualTime}};
-
 }  // namespace
 
-std::span<const GroupEntry> VirtualTimeGroups() { return kGroups; }
+std::span<const GroupEntry> VirtualTimeGroups() {
+    static constexpr GroupEntry kGroups[] = {{"vt", "Virtual time", kVirtualTime}};
+    return kGroups;
+}
 
 }  // namespace tavctl

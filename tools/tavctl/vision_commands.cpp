@@ -72,7 +72,7 @@ HRESULT ReadByIndex(Verb& v, ULONG index, CameraInfo& info) {
                                              info.mac.Receive(), &info.status, info.user.Receive());
 }
 
-int Info(Verb& v) {
+int ShowCamera(Verb& v) {
     const auto index = v.NumberOption<ULONG>("--index");
     if (!index) {
         const auto camera = v.Text("CAMERA");
@@ -102,7 +102,7 @@ int Count(Verb& v) {
 }
 
 // The cameras one by one through their indexes (the count first).
-int List(Verb& v) {
+int CameraList(Verb& v) {
     v.End();
     const auto lumeret = v.Interface<L>();
     ULONG count = 0;
@@ -132,7 +132,7 @@ int Valid(Verb& v) {
     return v.GetShown(AsBoolean, "IsCameraValid", &L::IsCameraValid, &L::UnpackIsCameraValid, camera.Get());
 }
 
-int Status(Verb& v) {
+int CameraStatus(Verb& v) {
     const auto camera = v.Text("CAMERA");
     v.End();
     return v.Get("GetCameraStatus", &L::GetCameraStatus, &L::UnpackCameraStatus, camera.Get());
@@ -145,7 +145,7 @@ int Rename(Verb& v) {
     return v.Set("SetCameraName", &L::SetCameraName, index, name.Get());
 }
 
-int State(Verb& v) {
+int CameraState(Verb& v) {
     const auto camera = v.Text("CAMERA");
     const auto state = v.Enum<TavCameraStatus>("STATE");
     v.End();
@@ -196,14 +196,14 @@ int Credentials(Verb& v) {
 }
 
 constexpr VerbEntry kCamera[] = {
-    {"list", "", "list the cameras (GetNumberOfCameras, GetCameraInfoUsingIndex2)", List},
+    {"list", "", "list the cameras (GetNumberOfCameras, GetCameraInfoUsingIndex2)", CameraList},
     {"count", "", "print the number of cameras (GetNumberOfCameras)", Count},
     {"valid", "CAMERA", "tell whether a camera name is valid (IsCameraValid)", Valid},
-    {"status", "CAMERA", "print a camera's status (GetCameraStatus)", Status},
+    {"status", "CAMERA", "print a camera's status (GetCameraStatus)", CameraStatus},
     {"info", "CAMERA | --index N", "print everything about a camera (GetCameraInfo2, GetCameraInfoUsingIndex2)",
-     Info},
+     ShowCamera},
     {"rename", "INDEX NAME", "rename a camera (SetCameraName)", Rename},
-    {"state", "CAMERA STATE", "set a camera's state (SetCameraState)", State,
+    {"state", "CAMERA STATE", "set a camera's state (SetCameraState)", CameraState,
      "STATE: a TavCameraStatus name (CameraStatus_Program, CameraStatus_Running, ...),\n"
      "or its last part (program, running).\n"},
     {"ip", "CAMERA ADDRESS MASK GATEWAY", "set a camera's IP settings (SetCameraIPSettings)", Ip},
@@ -215,10 +215,11 @@ constexpr VerbEntry kCamera[] = {
      Credentials},
 };
 
-constexpr GroupEntry kGroups[] = {{"camera", "Vision cameras", kCamera}};
-
 }  // namespace
 
-std::span<const GroupEntry> VisionGroups() { return kGroups; }
+std::span<const GroupEntry> VisionGroups() {
+    static constexpr GroupEntry kGroups[] = {{"camera", "Vision cameras", kCamera}};
+    return kGroups;
+}
 
 }  // namespace tavctl
