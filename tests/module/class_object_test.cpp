@@ -72,14 +72,12 @@ TEST_F(ClassObjects, UnloadIsRefusedWhileAnythingLives) {
     EXPECT_EQ(factory->LockServer(TRUE), S_OK);
     factory.Reset();
     EXPECT_EQ(DllCanUnloadNow(), S_FALSE) << "two server locks";
-    ASSERT_EQ(ClassObjectFor(kClasses[16], factory), S_OK);
-    EXPECT_EQ(factory->LockServer(FALSE), S_OK);
-    factory.Reset();
-    EXPECT_EQ(DllCanUnloadNow(), S_FALSE) << "one server lock";
-    ASSERT_EQ(ClassObjectFor(kClasses[16], factory), S_OK);
-    EXPECT_EQ(factory->LockServer(FALSE), S_OK);
-    factory.Reset();
-    EXPECT_EQ(DllCanUnloadNow(), S_OK);
+    for (const HRESULT afterUnlock : {S_FALSE, S_OK}) {
+        ASSERT_EQ(ClassObjectFor(kClasses[16], factory), S_OK);
+        EXPECT_EQ(factory->LockServer(FALSE), S_OK);
+        factory.Reset();
+        EXPECT_EQ(DllCanUnloadNow(), afterUnlock);
+    }
 }
 
 TEST_F(ClassObjects, UnloadIsRefusedWhileAnEnumeratorOutlivesItsController) {

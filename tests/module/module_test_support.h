@@ -4,6 +4,7 @@
 
 #include "TavController.h"
 #include "module/server_exports.h"
+#include "support/test_text.h"
 #include "tav/com_ptr.h"
 #include "tav/platform.h"
 
@@ -47,10 +48,10 @@ inline HRESULT ClassObjectFor(const ClassInfo& info, ComPtr<IClassFactory>& fact
 }
 
 // The GUID in its registry form, "{...}", as narrow text.
-std::string GuidText(REFGUID guid);
-
-// Converts between the registry's 16-bit text and ASCII test text.
-std::basic_string<OLECHAR> Wide(const std::string& text);
-std::string Narrow(const OLECHAR* text, size_t length);
+inline std::string GuidText(REFGUID guid) {
+    OLECHAR text[40] = {};
+    const int length = StringFromGUID2(guid, text, 40);
+    return length > 0 ? Narrow(OleStringView(text, static_cast<size_t>(length - 1))) : std::string();
+}
 
 }  // namespace tav::test

@@ -40,7 +40,7 @@ struct OpenKey {
 
 RegistrySandbox::RegistrySandbox() {
     location_ = "Software\\TavControllerTests\\" + ProcessId() + "-" + std::to_string(++sandboxCount);
-    const auto base = Wide(location_);
+    const auto base = Widen(location_);
     auto create = [](HKEY parent, const std::basic_string<OLECHAR>& name, HKEY* key) {
         return RegCreateKeyExW(parent, name.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, key, nullptr) ==
                ERROR_SUCCESS;
@@ -60,7 +60,7 @@ RegistrySandbox::~RegistrySandbox() {
     for (HKEY key : {classes_, user_, machine_}) {
         if (key != nullptr) RegCloseKey(key);
     }
-    RegDeleteTreeW(HKEY_CURRENT_USER, Wide(location_).c_str());
+    RegDeleteTreeW(HKEY_CURRENT_USER, Widen(location_).c_str());
     RegDeleteKeyW(HKEY_CURRENT_USER, L"Software\\TavControllerTests");  // only when no other sandbox is left
 }
 
@@ -121,9 +121,10 @@ void Collect(HKEY key, const std::string& path, RegistrySnapshot& snapshot) {
             const auto* chars = reinterpret_cast<const OLECHAR*>(data.data());
             size_t length = dataSize / sizeof(OLECHAR);
             while (length > 0 && chars[length - 1] == 0) --length;
-            text = Narrow(chars, length);
+            text = Narrow(OleStringView(chars, length));
         }
-        snapshot.insert(path + "|" + (nameLength == 0 ? std::string("@") : Narrow(name, nameLength)) + "=" + text);
+        const std::string valueName = nameLength == 0 ? std::string("@") : Narrow(OleStringView(name, nameLength));
+        snapshot.insert(path + "|" + valueName + "=" + text);
     }
     for (DWORD i = 0;; ++i) {
         OLECHAR name[256];
@@ -134,7 +135,7 @@ void Collect(HKEY key, const std::string& path, RegistrySnapshot& snapshot) {
         OpenKey sub;
         if (RegOpenKeyExW(key, std::basic_string<OLECHAR>(name, nameLength).c_str(), 0, KEY_READ, &sub.key) ==
             ERROR_SUCCESS) {
-            Collect(sub.key, prefix + Narrow(name, nameLength), snapshot);
+            Collect(sub.key, prefix + Narrow(OleStringView(name, nameLength)), snapshot);
         }
     }
 }
@@ -144,37 +145,26 @@ void Collect(HKEY key, const std::string& path, RegistrySnapshot& snapshot) {
 RegistrySnapshot TakeSnapshot(HKEY root, const std::string& path) {
     RegistrySnapshot snapshot;
     OpenKey key;
-    if (RegOpenKeyExW(root, Wide(path).c_str(), 0, KEY_READ, &key.key) == ERROR_SUCCESS) {
+    if (RegOpenKeyExW(root, Widen(path).c_str(), 0, KEY_READ, &key.key) == ERROR_SUCCESS) {
         Collect(key.key, std::string(), snapshot);
     }
     return snapshot;
 }
 
 std::string ReadString(HKEY root, const std::string& key, const std::string& name) {
-    OpenKey open;
-    if (RegOpenKeyExW(root, Wide(key).c_str(), 0, KEY_READ, &open.key) != ERROR_SUCCESS) {
-        return "<missing>";
+    const std::string prefix = "|" + (name.empty() ? std::string("@") : name) + "=";
+    for (const std::string& entry : TakeSnapshot(root, key)) {
+        if (entry.rfind(prefix, 0) == 0) return entry.substr(prefix.size());
     }
-    OLECHAR text[1024] = {};
-    DWORD size = sizeof(text) - sizeof(OLECHAR);
-    DWORD type = 0;
-    const auto wideName = Wide(name);
-    if (RegQueryValueExW(open.key, name.empty() ? nullptr : wideName.c_str(), nullptr, &type,
-                         reinterpret_cast<BYTE*>(text), &size) != ERROR_SUCCESS ||
-        type != REG_SZ) {
-        return "<missing>";
-    }
-    size_t length = size / sizeof(OLECHAR);
-    while (length > 0 && text[length - 1] == 0) --length;
-    return Narrow(text, length);
+    return "<missing>";
 }
 
 void WriteString(HKEY root, const std::string& key, const std::string& name, const std::string& text) {
     OpenKey open;
-    ASSERT_EQ(RegCreateKeyExW(root, Wide(key).c_str(), 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, &open.key, nullptr),
+    ASSERT_EQ(RegCreateKeyExW(root, Widen(key).c_str(), 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, &open.key, nullptr),
               ERROR_SUCCESS);
-    const auto wide = Wide(text);
-    const auto wideName = Wide(name);
+    const auto wide = Widen(text);
+    const auto wideName = Widen(name);
     ASSERT_EQ(RegSetValueExW(open.key, name.empty() ? nullptr : wideName.c_str(), 0, REG_SZ,
                              reinterpret_cast<const BYTE*>(wide.c_str()),
                              static_cast<DWORD>((wide.size() + 1) * sizeof(OLECHAR))),
@@ -184,7 +174,7 @@ void WriteString(HKEY root, const std::string& key, const std::string& name, con
 std::string ExecutablePath() {
     OLECHAR path[4096] = {};
     const DWORD length = GetModuleFileNameW(nullptr, path, 4096);
-    return Narrow(path, length);
+    return Narrow(OleStringView(path, length));
 }
 
 }  // namespace tav::test
