@@ -166,25 +166,5 @@ TEST_F(AutoConditionsTest, OutPointersAreCheckedBeforeTheType) {
     EXPECT_EQ(conditions, nullptr);
 }
 
-// Each allocation failing in turn (the list's copy, the records): a failure
-// without an enumerator, and nothing leaks.
-TEST_F(AutoConditionsTest, AllocationFailuresLeaveNoEnumerator) {
-    TestVariant data = TestVariant::Text("AUTO_CH -auto_ch 1 -noelts 1\tRunMode;1;1\t");
-    TavOperationMode mode{};
-    IEnumAutoCondition2* conditions = nullptr;
-    HRESULT hr = S_OK;
-    auto decode = [&] {
-        conditions = Garbage<IEnumAutoCondition2>();
-        hr = object_->UnpackOperationMode2(data.Get(), &mode, &conditions, nullptr);
-    };
-    const long runs = ForEachAllocationFailure(decode, [&] {
-        EXPECT_TRUE(hr == S_OK || (hr == E_OUTOFMEMORY && conditions == nullptr)) << hr;
-        if (hr == S_OK) conditions->Release();
-    });
-    if (runs < 0) GTEST_SKIP() << "allocation failures cannot be injected here";
-    EXPECT_GE(runs, 2);
-    conditions->Release();
-}
-
 }  // namespace
 }  // namespace tav::test

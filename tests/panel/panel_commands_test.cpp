@@ -13,78 +13,72 @@ TavControllerState state{};
 TavOperationMode mode{};
 TavCollisionDetectState collision{};
 
-class PanelCommandsTest : public ControllerTest {
-protected:
-    static CallPattern Pattern(const char* invalidParams, Call call, std::optional<std::string> nullOut = {},
-                               Call callNullOut = {}) {
-        CallPattern pattern;
-        pattern.call = [=](ControllerObject& o, TavInParams* rip, bool null) {
-            return null ? callNullOut(o, rip) : call(o, rip);
-        };
-        pattern.invalidParams = invalidParams;
-        pattern.nullOut = std::move(nullOut);
-        pattern.beforeInit = "TavController used before Initialized";
-        return pattern;
-    }
-};
+class PanelCommandsTest : public ControllerTest {};
 
-TEST_F(PanelCommandsTest, EveryCommandFollowsTheCallPattern) {
-    const CallPattern patterns[] = {
-        Pattern("SetControllerState. Invalid TavInParams.", PANEL_CALL(o.SetControllerState(rip, MotorsOn))),
-        Pattern("SetControllerStateKeyLess. Invalid TavInParams.",
-                PANEL_CALL(o.SetControllerStateKeyLess(rip, MotorsOn))),
-        Pattern("TavController::GetControllerState. Invalid argument.", PANEL_CALL(o.GetControllerState(rip, &state)),
-                "GetControllerState. Invalid out-parameter.", PANEL_CALL(o.GetControllerState(rip, nullptr))),
-        Pattern("GetOperationMode. Invalid TavInParams.", PANEL_CALL(o.GetOperationMode(rip, &mode)),
-                "GetOperationMode. Invalid out-parameter.", PANEL_CALL(o.GetOperationMode(rip, nullptr))),
-        Pattern("GetOperationMode. Invalid TavInParams.", PANEL_CALL(o.GetOperationMode2(rip, &mode, nullptr, nullptr)),
-                "GetOperationMode. Invalid out-parameter.",
-                PANEL_CALL(o.GetOperationMode2(rip, nullptr, nullptr, nullptr))),
-        Pattern("LockOPModePinCode: Invalid TavInParams", PANEL_CALL(o.SetOPMode(rip, Manr))),
-        Pattern("GetCollisionDetectState. Invalid argument.", PANEL_CALL(o.GetCollisionDetectState(rip, &collision)),
-                "GetCollisionDetectState. Invalid out-parameter.", PANEL_CALL(o.GetCollisionDetectState(rip, nullptr))),
-        Pattern("Acknowledge: Invalid TavInParams", PANEL_CALL(o.Acknowledge(rip, ColDetAck))),
-        Pattern("AcknowledgeAutoCondition: Invalid TavInParams",
-                PANEL_CALL(o.AcknowledgeAutoCondition(rip, AutoConditionAck_Keep, 3))),
+// Each command's text; the first row of an operation also carries the texts
+// of its call pattern (invalidParams, and nullOut with the call that passes
+// a NULL out-pointer).
+TEST_F(PanelCommandsTest, CommandsFollowTheCallPatternAndSendTheirTexts) {
+    struct Case {
+        Call call;
+        const char* verb;
+        const char* command;
+        const char* args;
+        const char* invalidParams = nullptr;
+        const char* nullOut = nullptr;
+        Call callNullOut = {};
     };
-    for (const CallPattern& pattern : patterns) {
-        SCOPED_TRACE(pattern.invalidParams);
-        ExpectCallPattern(pattern);
-    }
-}
-
-TEST_F(PanelCommandsTest, SendsTheCommandTexts) {
-    const std::tuple<Call, const char*, const char*, const char*> cases[] = {
+    const char* opModeParams = "LockOPModePinCode: Invalid TavInParams";
+    const Case cases[] = {
         {PANEL_CALL(o.SetControllerState(rip, MotorsOff)), "Set", "State", "STAND_BY"},
-        {PANEL_CALL(o.SetControllerState(rip, MotorsOn)), "Set", "State", "RUN"},
-        {PANEL_CALL(o.SetControllerStateKeyLess(rip, MotorsOn)), "Set", "StateUsingKeyLess", "RUN"},
-        {PANEL_CALL(o.GetControllerState(rip, &state)), "Get", "State", ""},
-        {PANEL_CALL(o.GetOperationMode(rip, &mode)), "Get", "Mode", ""},
-        {PANEL_CALL(o.GetOperationMode2(rip, &mode, nullptr, nullptr)), "Get", "Mode", ""},
+        {PANEL_CALL(o.SetControllerState(rip, MotorsOn)), "Set", "State", "RUN",
+         "SetControllerState. Invalid TavInParams."},
+        {PANEL_CALL(o.SetControllerStateKeyLess(rip, MotorsOn)), "Set", "StateUsingKeyLess", "RUN",
+         "SetControllerStateKeyLess. Invalid TavInParams."},
+        {PANEL_CALL(o.GetControllerState(rip, &state)), "Get", "State", "",
+         "TavController::GetControllerState. Invalid argument.", "GetControllerState. Invalid out-parameter.",
+         PANEL_CALL(o.GetControllerState(rip, nullptr))},
+        {PANEL_CALL(o.GetOperationMode(rip, &mode)), "Get", "Mode", "", "GetOperationMode. Invalid TavInParams.",
+         "GetOperationMode. Invalid out-parameter.", PANEL_CALL(o.GetOperationMode(rip, nullptr))},
+        {PANEL_CALL(o.GetOperationMode2(rip, &mode, nullptr, nullptr)), "Get", "Mode", "",
+         "GetOperationMode. Invalid TavInParams.", "GetOperationMode. Invalid out-parameter.",
+         PANEL_CALL(o.GetOperationMode2(rip, nullptr, nullptr, nullptr))},
         {PANEL_CALL(o.SetOPMode(rip, Auto)), "Set", "OPMode", "-opmode auto"},
-        {PANEL_CALL(o.SetOPMode(rip, Manr)), "Set", "OPMode", "-opmode manr"},
+        {PANEL_CALL(o.SetOPMode(rip, Manr)), "Set", "OPMode", "-opmode manr", opModeParams},
         {PANEL_CALL(o.SetOPMode(rip, Manf)), "Set", "OPMode", "-opmode manf"},
-        {PANEL_CALL(o.GetCollisionDetectState(rip, &collision)), "Get", "ColdetState", ""},
+        {PANEL_CALL(o.GetCollisionDetectState(rip, &collision)), "Get", "ColdetState", "",
+         "GetCollisionDetectState. Invalid argument.", "GetCollisionDetectState. Invalid out-parameter.",
+         PANEL_CALL(o.GetCollisionDetectState(rip, nullptr))},
         {PANEL_CALL(o.Acknowledge(rip, AutoAck)), "Set", "Ack", "AUTO"},
         {PANEL_CALL(o.Acknowledge(rip, ManfAck)), "Set", "Ack", "MANF"},
-        {PANEL_CALL(o.Acknowledge(rip, ColDetAck)), "Set", "Ack", "COLDET"},
+        {PANEL_CALL(o.Acknowledge(rip, ColDetAck)), "Set", "Ack", "COLDET", "Acknowledge: Invalid TavInParams"},
         {PANEL_CALL(o.AcknowledgeAutoCondition(rip, AutoConditionAck_Reset, 0)), "Set", "AutoCondAck",
          "-AutoCondAck Reset -ID 0"},
         {PANEL_CALL(o.AcknowledgeAutoCondition(rip, AutoConditionAck_Keep, 17)), "Set", "AutoCondAck",
-         "-AutoCondAck Keep -ID 17"},
+         "-AutoCondAck Keep -ID 17", "AcknowledgeAutoCondition: Invalid TavInParams"},
         {PANEL_CALL(o.AcknowledgeAutoCondition(rip, AutoConditionAck_Keep, 4294967295u)), "Set", "AutoCondAck",
          "-AutoCondAck Keep -ID 4294967295"},
     };
-    ControllerObject* object = Make();
-    for (const auto& [call, verb, command, args] : cases) {
-        SCOPED_TRACE(args);
+    for (const Case& c : cases) {
+        SCOPED_TRACE(std::string(c.command) + " " + c.args);
+        if (c.invalidParams != nullptr) {
+            CallPattern pattern;
+            pattern.call = [&c](ControllerObject& o, TavInParams* rip, bool null) {
+                return null ? c.callNullOut(o, rip) : c.call(o, rip);
+            };
+            pattern.invalidParams = c.invalidParams;
+            pattern.beforeInit = "TavController used before Initialized";
+            if (c.nullOut != nullptr) pattern.nullOut = c.nullOut;
+            ExpectCallPattern(pattern);
+        }
+        ControllerObject* object = Make();
         TavInParams rip = AsyncCall();
-        EXPECT_EQ(call(*object, &rip), S_OK);
-        EXPECT_EQ(LastCommand().verb, verb);
-        EXPECT_EQ(LastCommand().command, command);
-        EXPECT_EQ(LastCommand().args, args);
+        EXPECT_EQ(c.call(*object, &rip), S_OK);
+        EXPECT_EQ(LastCommand().verb, c.verb);
+        EXPECT_EQ(LastCommand().command, c.command);
+        EXPECT_EQ(LastCommand().args, c.args);
+        Component().JoinDeliveries();
     }
-    Component().JoinDeliveries();
 }
 
 // After the initialised check, and before anything is sent.

@@ -66,17 +66,6 @@ TEST_F(SpeedAndPinTest, SendsTheCommandTexts) {
     }
 }
 
-// LockOPModePinCode is LockOPModePinCode2 with permanent 0, through the
-// object's own interface: an override of the latter is what runs.
-TEST_F(SpeedAndPinTest, LockGoesThroughItsSuccessor) {
-    ControllerObject* object = Make();
-    ASSERT_EQ(object->LockOPModePinCode(nullptr, 9), S_OK);
-    EXPECT_EQ(LastCommand().args, "-pincode 0009 -permanent 0");
-    TavInParams foreign = ForeignCallback();
-    EXPECT_EQ(object->LockOPModePinCode(&foreign, 9), E_INVALIDARG);
-    EXPECT_TRUE(HasError("LockOPModePinCode: Invalid TavInParams"));
-}
-
 TEST_F(SpeedAndPinTest, RatiosOutsideAPercentAreRefusedBeforeSending) {
     ControllerObject* object = Make();
     for (const short ratio : {short{-1}, short{101}, short{-32768}, short{32767}}) {
