@@ -2,8 +2,6 @@
 
 #include <atomic>
 
-#include "tav/variant.h"
-
 namespace tav::sim::test {
 namespace {
 
@@ -23,71 +21,9 @@ std::string TextOf(const VARIANT& data) {
 
 }  // namespace
 
-HRESULT ReplyCollector::QueryInterface(REFIID riid, void** object) {
-    if (riid == IID_IUnknown || riid == IID_ITavCommandCallback) {
-        *object = static_cast<ITavCommandCallback*>(this);
-        AddRef();
-        return S_OK;
-    }
-    *object = nullptr;
-    return E_NOINTERFACE;
-}
-
-HRESULT ReplyCollector::OnCommandReply(TavCommandReply* reply) {
-    {
-        std::lock_guard lock(mutex_);
-        replies_.push_back({reply->status, reply->data.vt, TextOf(reply->data), reply->userDef,
-                            std::this_thread::get_id() == creator_});
-    }
-    arrived_.notify_all();
-    return S_OK;
-}
-
-bool ReplyCollector::WaitFor(std::size_t count, std::chrono::milliseconds limit) {
-    std::unique_lock lock(mutex_);
-    return arrived_.wait_for(lock, limit, [&] { return replies_.size() >= count; });
-}
-
-std::vector<ReplyCollector::Received> ReplyCollector::All() {
-    std::lock_guard lock(mutex_);
-    return replies_;
-}
-
-HRESULT EventCollector::QueryInterface(REFIID riid, void** object) {
-    if (riid == IID_IUnknown || riid == IID__ITavObjectEvents) {
-        *object = static_cast<_ITavObjectEvents*>(this);
-        AddRef();
-        return S_OK;
-    }
-    *object = nullptr;
-    return E_NOINTERFACE;
-}
-
-HRESULT EventCollector::OnChange(TavEventData* data) {
-    {
-        std::lock_guard lock(mutex_);
-        events_.push_back({data->userDef, data->Data.vt, TextOf(data->Data), data->time, data->status, data->eventId});
-    }
-    if (during) {
-        during();
-    }
-    arrived_.notify_all();
-    return S_OK;
-}
-
-bool EventCollector::WaitFor(std::size_t count, std::chrono::milliseconds limit) {
-    std::unique_lock lock(mutex_);
-    return arrived_.wait_for(lock, limit, [&] { return events_.size() >= count; });
-}
-
-std::vector<EventCollector::Received> EventCollector::All() {
-    std::lock_guard lock(mutex_);
-    return events_;
-}
-
-std::vector<std::string> EventCollector::Texts() {
+std::vector<std::string> Texts(EventSink& sink) {
     std::vector<std::string> texts;
-    for (const auto& event : All()) {
+    for (const auto& event : sink.All()) {
         texts.push_back(event.text);
     }
     return texts;
@@ -131,7 +67,7 @@ std::string SimTest::ErrorTextOf(IUnknown* component) {
     return Narrow(text.View());
 }
 
-ULONG SimTest::Subscribe(EventCollector* sink, std::string_view eventName, ULONG userDef, TavContainData containData,
+ULONG SimTest::Subscribe(_ITavObjectEvents* sink, std::string_view eventName, ULONG userDef, TavContainData containData,
                          HRESULT* result) {
     TavEventParams params{};
     params.riid = const_cast<GUID*>(&IID__ITavObjectEvents);
@@ -146,16 +82,6 @@ ULONG SimTest::Subscribe(EventCollector* sink, std::string_view eventName, ULONG
         *result = hr;
     }
     return cookie;
-}
-
-TavInParams AsyncParams(ITavCommandCallback* callback, ULONG userDef, ULONG timeOut) {
-    TavInParams rip{};
-    rip.riid = const_cast<GUID*>(&IID_ITavCommandCallback);
-    rip.pCallback = callback;
-    rip.callType = Async;
-    rip.timeOut = timeOut;
-    rip.userDef = userDef;
-    return rip;
 }
 
 std::chrono::milliseconds Since(std::chrono::steady_clock::time_point start) {

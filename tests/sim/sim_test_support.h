@@ -1,9 +1,6 @@
 #pragma once
 #include <chrono>
-#include <condition_variable>
-#include <functional>
 #include <memory>
-#include <mutex>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -14,6 +11,8 @@
 #include "TavSiblings.h"
 #include "sim/virtual_controller.h"
 #include "support/com_double.h"
+#include "support/event_sink.h"
+#include "support/reply_recorder.h"
 #include "tav/bstr.h"
 #include "tav/com_ptr.h"
 
@@ -34,65 +33,12 @@ struct Outcome {
     ULONG userDef = 0;
 };
 
-// Records the replies handed to an asynchronous call's callback.
-class ReplyCollector final : public ITavCommandCallback {
-public:
-    struct Received {
-        HRESULT status;
-        VARTYPE type;
-        std::string text;
-        ULONG userDef;
-        bool onCallingThread;
-    };
+using tav::test::EventSink;
+using tav::test::AsyncParams;
+using tav::test::ReplyRecorder;
 
-    HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override;
-    HRESULT STDMETHODCALLTYPE OnCommandReply(TavCommandReply* reply) override;
-    TAV_TEST_DOUBLE_REFCOUNT
-
-    // True when `count` replies arrived within `limit`.
-    bool WaitFor(std::size_t count, std::chrono::milliseconds limit = 5s);
-    std::vector<Received> All();
-
-private:
-    ~ReplyCollector() = default;
-
-    tav::test::RefCount refs_;
-    const std::thread::id creator_ = std::this_thread::get_id();
-    std::mutex mutex_;
-    std::condition_variable arrived_;
-    std::vector<Received> replies_;
-};
-
-// Records the events handed to a subscription's sink; `during`, when set,
-// runs inside OnChange.
-class EventCollector final : public _ITavObjectEvents {
-public:
-    struct Received {
-        ULONG userDef;
-        VARTYPE type;
-        std::string text;
-        FILETIME time;
-        HRESULT status;
-        ULONG eventId;
-    };
-
-    HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override;
-    HRESULT STDMETHODCALLTYPE OnChange(TavEventData* data) override;
-    TAV_TEST_DOUBLE_REFCOUNT
-
-    bool WaitFor(std::size_t count, std::chrono::milliseconds limit = 5s);
-    std::vector<Received> All();
-    std::vector<std::string> Texts();
-    std::function<void()> during;
-
-private:
-    ~EventCollector() = default;
-
-    tav::test::RefCount refs_;
-    std::mutex mutex_;
-    std::condition_variable arrived_;
-    std::vector<Received> events_;
-};
+// The texts of the events a sink received, in order.
+std::vector<std::string> Texts(EventSink& sink);
 
 // A command component created through CoCreateInstance, as Init creates it,
 // talking to a controller of its own (a fresh URL per test).
@@ -109,7 +55,7 @@ protected:
     static std::string ErrorTextOf(IUnknown* component);
 
     // Subscribes sink to eventName with kind 1; the cookie, 0 on failure.
-    ULONG Subscribe(EventCollector* sink, std::string_view eventName, ULONG userDef = 7,
+    ULONG Subscribe(_ITavObjectEvents* sink, std::string_view eventName, ULONG userDef = 7,
                     TavContainData containData = Data, HRESULT* result = nullptr);
 
     std::string Url() const { return Narrow(url_); }
@@ -119,9 +65,6 @@ protected:
     std::shared_ptr<ControllerModel> controller_;
     ComPtr<ITavComCtrl> command_;
 };
-
-// Async TavInParams that deliver to `callback`.
-TavInParams AsyncParams(ITavCommandCallback* callback, ULONG userDef, ULONG timeOut = 0);
 
 std::chrono::milliseconds Since(std::chrono::steady_clock::time_point start);
 

@@ -1,6 +1,7 @@
 // Subscriptions: OnChange delivery of State and Mode, unsubscribing, the
-// connection's own events, and clean shutdown.
-#include <cstdlib>
+// connection's own events, and clean shutdown. What an event carries besides
+// its text is checked end to end (e2e_events).
+#include <atomic>
 
 #include "sim/status_codes.h"
 #include "sim_test_support.h"
@@ -10,18 +11,10 @@ namespace {
 
 using SubscriptionTest = SimTest;
 
-constexpr std::uint64_t kUnixEpochTicks = 116444736000000000ull;
-
-std::uint64_t SecondsOf(const FILETIME& time) {
-    const std::uint64_t ticks = (static_cast<std::uint64_t>(time.dwHighDateTime) << 32) | time.dwLowDateTime;
-    return (ticks - kUnixEpochTicks) / 10000000ull;
-}
-
 TEST_F(SubscriptionTest, StateChangesReachTheSinkAsTheyHappen) {
     ASSERT_EQ(S_OK, Get("State").status);  // binds the component to its controller
-    Ref<EventCollector> sink(new EventCollector);
-    const ULONG cookie = Subscribe(sink.get(), "State", 42);
-    ASSERT_NE(0u, cookie);
+    tav::test::SinkRef sink;
+    ASSERT_NE(0u, Subscribe(sink.sink, "State"));
 
     ASSERT_EQ(S_OK, Set("State", "STAND_BY").status);  // no change, no event
     ASSERT_EQ(S_OK, Set("State", "RUN").status);
@@ -33,20 +26,15 @@ TEST_F(SubscriptionTest, StateChangesReachTheSinkAsTheyHappen) {
     ASSERT_EQ(2u, events.size());
     EXPECT_EQ("RUN", events[0].text);
     EXPECT_EQ("STAND_BY", events[1].text);
-    EXPECT_EQ(42u, events[0].userDef);
-    EXPECT_EQ(VT_BSTR, events[0].type);
-    EXPECT_EQ(S_OK, events[0].status);
     EXPECT_LT(events[0].eventId, events[1].eventId);
-    const auto lag = static_cast<long long>(SecondsOf(events[0].time)) - static_cast<long long>(controller_->Now());
-    EXPECT_LE(std::llabs(lag), 2);
 }
 
 TEST_F(SubscriptionTest, ModeEventsFollowTheChangeToAutomatic) {
     ASSERT_EQ(S_OK, Get("Mode").status);
-    Ref<EventCollector> sink(new EventCollector);
-    ASSERT_NE(0u, Subscribe(sink.get(), "Mode"));
-    Ref<EventCollector> conditions(new EventCollector);
-    ASSERT_NE(0u, Subscribe(conditions.get(), "AutoCondSub"));
+    tav::test::SinkRef sink;
+    ASSERT_NE(0u, Subscribe(sink.sink, "Mode"));
+    tav::test::SinkRef conditions;
+    ASSERT_NE(0u, Subscribe(conditions.sink, "AutoCondSub"));
 
     // Every change gives its event, however quickly the next one follows.
     ASSERT_EQ(S_OK, Set("OPMode", "-opmode auto").status);
@@ -54,28 +42,18 @@ TEST_F(SubscriptionTest, ModeEventsFollowTheChangeToAutomatic) {
     ASSERT_EQ(S_OK, Set("Ack", "AUTO").status);
     ASSERT_TRUE(sink->WaitFor(3) && conditions->WaitFor(3));
 
-    const auto texts = sink->Texts();
+    const auto texts = Texts(*sink.sink);
     EXPECT_EQ("AUTO_CH -auto_ch 1 -noelts 3\tBlk;1;1\tSpeedOvr;1;2\tRunMode;0;3\t", texts[0]);
     EXPECT_EQ("AUTO_CH -auto_ch 1 -noelts 2\tSpeedOvr;1;2\tRunMode;0;3\t", texts[1]);
     EXPECT_EQ("AUTO", texts[2]);
-    EXPECT_EQ("-auto_ch 0 -noelts 0\t", conditions->Texts()[2]);
-}
-
-TEST_F(SubscriptionTest, NoDataSubscriptionGetsTheNoticeAlone) {
-    ASSERT_EQ(S_OK, Get("State").status);
-    Ref<EventCollector> sink(new EventCollector);
-    ASSERT_NE(0u, Subscribe(sink.get(), "State", 1, NoData));
-    ASSERT_EQ(S_OK, Set("State", "RUN").status);
-    ASSERT_TRUE(sink->WaitFor(1));
-    EXPECT_EQ(VT_EMPTY, sink->All()[0].type);
+    EXPECT_EQ("-auto_ch 0 -noelts 0\t", Texts(*conditions.sink)[2]);
 }
 
 TEST_F(SubscriptionTest, UnsubscribeStopsDeliveryAndReleasesTheSink) {
     ASSERT_EQ(S_OK, Get("State").status);
-    Ref<EventCollector> kept(new EventCollector);
-    Ref<EventCollector> dropped(new EventCollector);
-    const ULONG keptCookie = Subscribe(kept.get(), "State");
-    const ULONG droppedCookie = Subscribe(dropped.get(), "State");
+    tav::test::SinkRef kept, dropped;
+    const ULONG keptCookie = Subscribe(kept.sink, "State");
+    const ULONG droppedCookie = Subscribe(dropped.sink, "State");
     ASSERT_NE(keptCookie, droppedCookie);
 
     EXPECT_EQ(S_OK, command_->Unsubscribe(nullptr, droppedCookie));
@@ -85,26 +63,49 @@ TEST_F(SubscriptionTest, UnsubscribeStopsDeliveryAndReleasesTheSink) {
 
     ASSERT_EQ(S_OK, Set("State", "RUN").status);
     ASSERT_TRUE(kept->WaitFor(1));
-    EXPECT_TRUE(dropped->All().empty());
+    EXPECT_EQ(0u, dropped->Count());
 }
+
+// Unsubscribes from inside its own OnChange.
+class UnsubscribingSink final : public _ITavObjectEvents {
+public:
+    HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override {
+        *object = riid == IID_IUnknown || riid == IID__ITavObjectEvents ? this : nullptr;
+        return *object ? (AddRef(), S_OK) : E_NOINTERFACE;
+    }
+    HRESULT STDMETHODCALLTYPE OnChange(TavEventData*) override {
+        ++calls;
+        return command->Unsubscribe(nullptr, cookie);
+    }
+    TAV_TEST_DOUBLE_REFCOUNT
+
+    ITavComCtrl* command = nullptr;
+    ULONG cookie = 0;
+    std::atomic<int> calls{0};
+
+private:
+    tav::test::RefCount refs_;
+};
 
 TEST_F(SubscriptionTest, SinkMayUnsubscribeFromItsOwnOnChange) {
     ASSERT_EQ(S_OK, Get("State").status);
-    Ref<EventCollector> sink(new EventCollector);
-    ULONG cookie = 0;
-    ITavComCtrl* command = command_.Get();
-    sink->during = [&cookie, command] { command->Unsubscribe(nullptr, cookie); };
-    cookie = Subscribe(sink.get(), "State");
+    auto* sink = new UnsubscribingSink;
+    sink->command = command_.Get();
+    sink->cookie = Subscribe(sink, "State");
     ASSERT_EQ(S_OK, Set("State", "RUN").status);
-    ASSERT_TRUE(sink->WaitFor(1));
+    for (int i = 0; i < 500 && sink->calls == 0; ++i) {
+        std::this_thread::sleep_for(10ms);
+    }
     ASSERT_EQ(S_OK, Set("State", "STAND_BY").status);
-    EXPECT_FALSE(sink->WaitFor(2, 200ms));
+    std::this_thread::sleep_for(200ms);
+    EXPECT_EQ(1, sink->calls.load());
+    sink->Release();
 }
 
 TEST_F(SubscriptionTest, SubscriptionsNeedAKnownEventAKnownKindAndAController) {
-    Ref<EventCollector> sink(new EventCollector);
+    tav::test::SinkRef sink;
     HRESULT hr = S_OK;
-    EXPECT_EQ(0u, Subscribe(sink.get(), "State", 1, Data, &hr));
+    EXPECT_EQ(0u, Subscribe(sink.sink, "State", 1, Data, &hr));
     EXPECT_EQ(E_UNEXPECTED, hr);  // nothing bound the component yet
 
     ComPtr<ITavUserComponent> user;
@@ -112,14 +113,14 @@ TEST_F(SubscriptionTest, SubscriptionsNeedAKnownEventAKnownKindAndAController) {
                                      reinterpret_cast<void**>(&user)));
     const Bstr url{TextView(url_)};
     ASSERT_EQ(S_OK, user->Initialize(url.Get(), command_.Get()));
-    EXPECT_NE(0u, Subscribe(sink.get(), "State", 1, Data, &hr));
+    EXPECT_NE(0u, Subscribe(sink.sink, "State", 1, Data, &hr));
 
-    EXPECT_EQ(0u, Subscribe(sink.get(), "Weather", 1, Data, &hr));
+    EXPECT_EQ(0u, Subscribe(sink.sink, "Weather", 1, Data, &hr));
     EXPECT_EQ(E_INVALIDARG, hr);
     EXPECT_NE(std::string::npos, ErrorTextOf(command_.Get()).find("\"Weather\""));
 
     TavEventParams params{};
-    params.pSink = sink.get();
+    params.pSink = sink.sink;
     ULONG cookie = 0;
     const Bstr state = B("State");
     EXPECT_EQ(E_INVALIDARG, command_->Subscribe(nullptr, &params, nullptr, state.Get(), nullptr, 3, &cookie));
@@ -127,15 +128,15 @@ TEST_F(SubscriptionTest, SubscriptionsNeedAKnownEventAKnownKindAndAController) {
     EXPECT_EQ(E_INVALIDARG, command_->Subscribe(nullptr, &params, nullptr, state.Get(), nullptr, 1, &cookie));
 
     controller_->Faults().FailTransport();
-    params.pSink = sink.get();
+    params.pSink = sink.sink;
     EXPECT_EQ(kStatusLinkDown, command_->Subscribe(nullptr, &params, nullptr, state.Get(), nullptr, 1, &cookie));
 }
 
 TEST_F(SubscriptionTest, ConnectionEventsTellWhenTheLinkGoesAndReturns) {
     ASSERT_EQ(S_OK, Get("State").status);
-    Ref<EventCollector> sink(new EventCollector);
+    tav::test::SinkRef sink;
     TavEventParams params{};
-    params.pSink = sink.get();
+    params.pSink = sink.sink;
     params.pollTime = 0x7FFFFFFF;
     params.userDef = 5;
     ULONG cookie = 0;
@@ -146,15 +147,15 @@ TEST_F(SubscriptionTest, ConnectionEventsTellWhenTheLinkGoesAndReturns) {
     controller_->Faults().RestoreTransport();
     ASSERT_TRUE(sink->WaitFor(3));
     EXPECT_EQ((std::vector<std::string>{"-Connection established", "-Connection lost", "-Connection restored"}),
-              sink->Texts());
+              Texts(*sink.sink));
     EXPECT_FALSE(sink->WaitFor(4, 100ms));
 }
 
 TEST_F(SubscriptionTest, ReleasingTheComponentEndsItsSubscriptions) {
     ASSERT_EQ(S_OK, Get("State").status);
-    Ref<EventCollector> sink(new EventCollector);
-    ASSERT_NE(0u, Subscribe(sink.get(), "State"));
-    ASSERT_NE(0u, Subscribe(sink.get(), "Mode"));
+    tav::test::SinkRef sink;
+    ASSERT_NE(0u, Subscribe(sink.sink, "State"));
+    ASSERT_NE(0u, Subscribe(sink.sink, "Mode"));
     command_ = nullptr;
     EXPECT_EQ(1u, sink->References());
     controller_->SetMotorsState(T("RUN"));

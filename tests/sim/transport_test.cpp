@@ -21,7 +21,7 @@ TEST_F(TransportTest, SyncCallReturnsTheReplyWithTheCallersUserDef) {
 
 TEST_F(TransportTest, AsyncCallReturnsAtOnceAndRepliesOnAWorkerThreadInOrder) {
     controller_->Faults().SetDelay(T("CtrlName"), 200ms);
-    Ref<ReplyCollector> callback(new ReplyCollector);
+    Ref<ReplyRecorder> callback = ReplyRecorder::Make();
     TavInParams first = AsyncParams(callback.get(), 1);
     TavInParams second = AsyncParams(callback.get(), 2);
     const auto start = std::chrono::steady_clock::now();
@@ -32,14 +32,14 @@ TEST_F(TransportTest, AsyncCallReturnsAtOnceAndRepliesOnAWorkerThreadInOrder) {
     EXPECT_EQ(S_OK, Execute("Get", "State", "", &second).hr);
 
     ASSERT_TRUE(callback->WaitFor(2));
-    const auto replies = callback->All();
+    const auto replies = callback->Replies();
     EXPECT_GE(Since(start), 200ms);
     EXPECT_EQ(1u, replies[0].userDef);
     EXPECT_EQ(S_OK, replies[0].status);
-    EXPECT_EQ(VT_EMPTY, replies[0].type);
+    EXPECT_EQ(VT_EMPTY, replies[0].vt);
     EXPECT_EQ(2u, replies[1].userDef);
     EXPECT_EQ("STAND_BY", replies[1].text);
-    EXPECT_FALSE(replies[0].onCallingThread);
+    EXPECT_NE(std::this_thread::get_id(), replies[0].thread);
     EXPECT_EQ("-Name \"async\"", Get("CtrlName").text);
 }
 
@@ -68,14 +68,15 @@ TEST_F(TransportTest, SlowReplyTimesOutSyncAndAsync) {
     EXPECT_EQ(kStatusTimedOut, reply.status);
     EXPECT_NE(std::string::npos, reply.text.find("100 ms")) << reply.text;
 
-    Ref<ReplyCollector> callback(new ReplyCollector);
-    TavInParams async = AsyncParams(callback.get(), 9, 100);
+    Ref<ReplyRecorder> callback = ReplyRecorder::Make();
+    TavInParams async = AsyncParams(callback.get(), 9);
+    async.timeOut = 100;
     start = std::chrono::steady_clock::now();
     ASSERT_EQ(S_OK, Execute("Set", "CtrlName", "-Name \"late\"", &async).hr);
     ASSERT_TRUE(callback->WaitFor(1));
     EXPECT_LT(Since(start), 1500ms);
-    EXPECT_EQ(kStatusTimedOut, callback->All()[0].status);
-    EXPECT_EQ(9u, callback->All()[0].userDef);
+    EXPECT_EQ(kStatusTimedOut, callback->Replies()[0].status);
+    EXPECT_EQ(9u, callback->Replies()[0].userDef);
 
     controller_->Faults().SetDelay(T("CtrlName"), 0ms);
     EXPECT_NE("-Name \"late\"", Get("CtrlName").text);
@@ -100,7 +101,7 @@ TEST_F(TransportTest, FailingTransportFailsExecuteWithTheComponentsErrorText) {
     EXPECT_EQ(down, reply.hr);
     EXPECT_EQ("the cable is cut; ", ErrorTextOf(command_.Get()));
 
-    Ref<ReplyCollector> callback(new ReplyCollector);
+    Ref<ReplyRecorder> callback = ReplyRecorder::Make();
     TavInParams async = AsyncParams(callback.get(), 1);
     EXPECT_EQ(down, Execute("Get", "State", "", &async).hr);
 
@@ -136,7 +137,7 @@ TEST_F(TransportTest, GarbledCommandAnswersHalfItsReplyAndAMark) {
 
 TEST_F(TransportTest, AsynchronousRequestsPastTheLimitAreRefusedNotQueued) {
     controller_->Faults().SetDelay(T("State"), 10s);  // the first one holds the worker
-    Ref<ReplyCollector> callback(new ReplyCollector);
+    Ref<ReplyRecorder> callback = ReplyRecorder::Make();
     TavInParams async = AsyncParams(callback.get(), 1);
     int accepted = 0;
     for (int i = 0; i < 300; ++i) {
@@ -165,16 +166,16 @@ TEST_F(TransportTest, BadCallsFailExecuteAndLeaveAText) {
               command_->Execute(nullptr, &reply, verb.Get(), noController.Get(), command.Get(), nullptr));
     EXPECT_NE(std::string::npos, ErrorTextOf(command_.Get()).find("\"sim\"")) << ErrorTextOf(command_.Get());
 
-    Ref<EventCollector> notACallback(new EventCollector);
+    tav::test::SinkRef notACallback;
     TavInParams rip{};
-    rip.pCallback = notACallback.get();
+    rip.pCallback = notACallback.sink;
     rip.callType = Async;
     EXPECT_EQ(E_NOINTERFACE, command_->Execute(&rip, &reply, verb.Get(), url.Get(), command.Get(), nullptr));
 }
 
 TEST_F(TransportTest, ReleasingTheComponentAbandonsPendingRepliesAndTheirCallbacks) {
     controller_->Faults().SetDelay(T("State"), 5000ms);
-    Ref<ReplyCollector> callback(new ReplyCollector);
+    Ref<ReplyRecorder> callback = ReplyRecorder::Make();
     TavInParams rip = AsyncParams(callback.get(), 1);
     ASSERT_EQ(S_OK, Execute("Get", "State", "", &rip).hr);
     ASSERT_EQ(S_OK, Execute("Get", "State", "", &rip).hr);
@@ -184,7 +185,7 @@ TEST_F(TransportTest, ReleasingTheComponentAbandonsPendingRepliesAndTheirCallbac
     command_ = nullptr;
     EXPECT_LT(Since(start), 2000ms);
     EXPECT_EQ(1u, callback->References());
-    EXPECT_TRUE(callback->All().empty());
+    EXPECT_EQ(0u, callback->Count());
 }
 
 TEST_F(TransportTest, CheckLinkAnswersSuccessWhileTheTransportIsUp) {
