@@ -1,4 +1,5 @@
 // Clock, restart and identity operations end to end against the virtual controller.
+#include "sim/status_codes.h"
 #include "virtual_controller_fixture.h"
 
 namespace tav::e2e {
@@ -79,14 +80,14 @@ TEST_F(ControllerE2eTest, VersionsEnvironmentOptionsAndState) {
     EXPECT_EQ(controller_->CheckFileTransferLink(nullptr), S_OK);
 }
 
-TEST_F(ControllerE2eTest, UnknownEnvironmentVariableIsTheControllersFailure) {
-    Bstr name(OLESTR("TAV_NO_SUCH_VARIABLE"));
+TEST_F(ControllerE2eTest, EnvironmentVariablesAreReadAtTheControllersRoot) {
+    Bstr name(OLESTR("TEMP"));
     Bstr value;
-    const HRESULT hr = controller_->GetEnvironmentVariable(nullptr, name.Get(), value.Receive());
-    if (SUCCEEDED(hr)) {
-        GTEST_SKIP() << "the virtual controller answers unknown variables";
-    }
-    EXPECT_NE(LastError().find("TavControllerImpl["), std::string::npos);
+    ASSERT_EQ(controller_->GetEnvironmentVariable(nullptr, name.Get(), value.Receive()), S_OK) << LastError();
+    EXPECT_EQ(Narrow(value), "/hd0a/temp");
+    Bstr unknown(OLESTR("TAV_NO_SUCH_VARIABLE"));
+    EXPECT_EQ(controller_->GetEnvironmentVariable(nullptr, unknown.Get(), value.Receive()), sim::kStatusNotFound);
+    EXPECT_NE(LastError().find("TavControllerImpl["), std::string::npos) << LastError();
 }
 
 TEST_F(ControllerE2eTest, ObjectsOfOneUrlShareTheController) {

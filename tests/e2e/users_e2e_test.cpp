@@ -27,10 +27,14 @@ protected:
         Master master;
         EXPECT_EQ(mastership->GetCurrentMaster(nullptr, resource, &master.status, &login, &master.thisIsMe), S_OK);
         master.alias = text::Narrow(OleStringView(login.userAlias, SysStringLen(login.userAlias)));
+        Free(login);
+        return master;
+    }
+    static void Free(TavLoginInfo& login) {
         SysFreeString(login.userAlias);
         SysFreeString(login.location);
         SysFreeString(login.application);
-        return master;
+        login = {};
     }
 
     ComPtr<ITavController> other_;
@@ -78,9 +82,7 @@ TEST_F(UsersEndToEndTest, APrivilegeRequestIsGrantedByAnotherClient) {
     ASSERT_EQ(secondUser_->GetPendingManualModePrivRequest(nullptr, &login, &pendingUser, &asked), S_OK);
     EXPECT_EQ(pendingUser, requester);
     EXPECT_EQ(asked, TavManualModePrivileges_Exec);
-    SysFreeString(login.userAlias);
-    SysFreeString(login.location);
-    SysFreeString(login.application);
+    Free(login);
 
     EXPECT_TRUE(FAILED(firstUser_->GrantManualModePrivileges(nullptr, requester, TavManualModePrivileges_Exec)))
         << "nobody grants their own request";
@@ -92,9 +94,7 @@ TEST_F(UsersEndToEndTest, APrivilegeRequestIsGrantedByAnotherClient) {
     ASSERT_EQ(firstUser_->GetManualModePrivilegesState(nullptr, &state, &login, &thisIsMe), S_OK);
     EXPECT_EQ(state, TavManualModePrivilegesState_Exec);
     EXPECT_EQ(thisIsMe, 1);
-    SysFreeString(login.userAlias);
-    SysFreeString(login.location);
-    SysFreeString(login.application);
+    Free(login);
 
     ASSERT_EQ(firstUser_->CancelManualModePrivileges(nullptr), S_OK);
     EXPECT_TRUE(FAILED(firstUser_->PollActiveRequest(nullptr)));
