@@ -16,108 +16,54 @@ struct Forwarded {
     std::function<HRESULT(ControllerObject&, TavInParams*, VARIANT*)> call;
 };
 
+// The out-values of the user operations, their strings freed when they go.
+struct Outs {
+    TavLoginInfo user{};
+    ULONG id = 0;
+    LONG me = 0;
+    TavManualModePrivileges priv{};
+    TavManualModePrivilegesState state{};
+    TavMastershipStatus status{};
+    TestBstr grants;
+    ~Outs() { SysFreeString(user.userAlias), SysFreeString(user.location), SysFreeString(user.application); }
+};
+
+#define USER_CALL(expression) [](ControllerObject& o, TavInParams* r, VARIANT* d) { Outs x; return expression; }
+
 std::vector<Forwarded> AllForwarded() {
     return {
-        {"LogonUser", "", [](ControllerObject& o, TavInParams* r, VARIANT*) { return o.LogonUser(r); }},
-        {"LogonUserAsLocal", "", [](ControllerObject& o, TavInParams* r, VARIANT*) { return o.LogonUserAsLocal(r); }},
-        {"LogoffUser", "", [](ControllerObject& o, TavInParams* r, VARIANT*) { return o.LogoffUser(r); }},
+        {"LogonUser", "", USER_CALL(o.LogonUser(r))},
+        {"LogonUserAsLocal", "", USER_CALL(o.LogonUserAsLocal(r))},
+        {"LogoffUser", "", USER_CALL(o.LogoffUser(r))},
         {"RequestManualModePrivileges", "priv=2",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) {
-             return o.RequestManualModePrivileges(r, TavManualModePrivileges_Exec);
-         }},
-        {"PollActiveRequest", "", [](ControllerObject& o, TavInParams* r, VARIANT*) { return o.PollActiveRequest(r); }},
-        {"CancelManualModePrivileges", "",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) { return o.CancelManualModePrivileges(r); }},
+         USER_CALL(o.RequestManualModePrivileges(r, TavManualModePrivileges_Exec))},
+        {"PollActiveRequest", "", USER_CALL(o.PollActiveRequest(r))},
+        {"CancelManualModePrivileges", "", USER_CALL(o.CancelManualModePrivileges(r))},
         {"UnpackManualModePrivRequestEvent", "",
-         [](ControllerObject& o, TavInParams*, VARIANT* d) {
-             TavLoginInfo user{};
-             ULONG id = 0;
-             TavManualModePrivileges priv{};
-             const HRESULT hr = o.UnpackManualModePrivRequestEvent(d, &user, &id, &priv);
-             SysFreeString(user.userAlias), SysFreeString(user.location), SysFreeString(user.application);
-             return hr;
-         }},
+         USER_CALL(o.UnpackManualModePrivRequestEvent(d, &x.user, &x.id, &x.priv))},
         {"GrantManualModePrivileges", "userID=7 priv=1",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) {
-             return o.GrantManualModePrivileges(r, 7, TavManualModePrivileges_Modify);
-         }},
+         USER_CALL(o.GrantManualModePrivileges(r, 7, TavManualModePrivileges_Modify))},
         {"GetManualModePrivilegesState", "",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) {
-             TavManualModePrivilegesState state{};
-             TavLoginInfo user{};
-             LONG me = 0;
-             const HRESULT hr = o.GetManualModePrivilegesState(r, &state, &user, &me);
-             SysFreeString(user.userAlias), SysFreeString(user.location), SysFreeString(user.application);
-             return hr;
-         }},
+         USER_CALL(o.GetManualModePrivilegesState(r, &x.state, &x.user, &x.me))},
         {"UnpackManualModePrivilegesState", "clientID=9",
-         [](ControllerObject& o, TavInParams*, VARIANT* d) {
-             TavManualModePrivilegesState state{};
-             TavLoginInfo user{};
-             LONG me = 0;
-             const HRESULT hr = o.UnpackManualModePrivilegesState(d, 9, &state, &user, &me);
-             SysFreeString(user.userAlias), SysFreeString(user.location), SysFreeString(user.application);
-             return hr;
-         }},
-        {"GetUserGrants", "",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) {
-             TestBstr grants;
-             return o.GetUserGrants(r, grants.Out());
-         }},
+         USER_CALL(o.UnpackManualModePrivilegesState(d, 9, &x.state, &x.user, &x.me))},
+        {"GetUserGrants", "", USER_CALL(o.GetUserGrants(r, x.grants.Out()))},
         {"GetPendingManualModePrivRequest", "",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) {
-             TavLoginInfo user{};
-             ULONG id = 0;
-             TavManualModePrivileges priv{};
-             const HRESULT hr = o.GetPendingManualModePrivRequest(r, &user, &id, &priv);
-             SysFreeString(user.userAlias), SysFreeString(user.location), SysFreeString(user.application);
-             return hr;
-         }},
+         USER_CALL(o.GetPendingManualModePrivRequest(r, &x.user, &x.id, &x.priv))},
         {"UnpackPendingManualModePrivRequest", "",
-         [](ControllerObject& o, TavInParams*, VARIANT* d) {
-             TavLoginInfo user{};
-             ULONG id = 0;
-             TavManualModePrivileges priv{};
-             const HRESULT hr = o.UnpackPendingManualModePrivRequest(d, &user, &id, &priv);
-             SysFreeString(user.userAlias), SysFreeString(user.location), SysFreeString(user.application);
-             return hr;
-         }},
-        {"GetUserId", "",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) {
-             ULONG id = 0;
-             return o.GetUserId(r, &id);
-         }},
-        {"ImpersonateUser", "userID=12",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) {
-             ULONG cid = 0;
-             return o.ImpersonateUser(r, 12, &cid);
-         }},
-        {"RemoveImpersonation", "",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) { return o.RemoveImpersonation(r); }},
-        {"RequestMastership", "resource=2",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) { return o.RequestMastership(r, ResourceMotion); }},
-        {"ReleaseMastership", "resource=1",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) { return o.ReleaseMastership(r, ResourceCFG); }},
+         USER_CALL(o.UnpackPendingManualModePrivRequest(d, &x.user, &x.id, &x.priv))},
+        {"GetUserId", "", USER_CALL(o.GetUserId(r, &x.id))},
+        {"ImpersonateUser", "userID=12", USER_CALL(o.ImpersonateUser(r, 12, &x.id))},
+        {"RemoveImpersonation", "", USER_CALL(o.RemoveImpersonation(r))},
+        {"RequestMastership", "resource=2", USER_CALL(o.RequestMastership(r, ResourceMotion))},
+        {"ReleaseMastership", "resource=1", USER_CALL(o.ReleaseMastership(r, ResourceCFG))},
         {"GetCurrentMaster", "resource=3",
-         [](ControllerObject& o, TavInParams* r, VARIANT*) {
-             TavMastershipStatus status{};
-             TavLoginInfo info{};
-             LONG me = 0;
-             const HRESULT hr = o.GetCurrentMaster(r, ResourceInfoStream, &status, &info, &me);
-             SysFreeString(info.userAlias), SysFreeString(info.location), SysFreeString(info.application);
-             return hr;
-         }},
-        {"UnpackCurrentMaster", "cid=5",
-         [](ControllerObject& o, TavInParams*, VARIANT* d) {
-             TavMastershipStatus status{};
-             TavLoginInfo info{};
-             LONG me = 0;
-             const HRESULT hr = o.UnpackCurrentMaster(d, 5, &status, &info, &me);
-             SysFreeString(info.userAlias), SysFreeString(info.location), SysFreeString(info.application);
-             return hr;
-         }},
+         USER_CALL(o.GetCurrentMaster(r, ResourceInfoStream, &x.status, &x.user, &x.me))},
+        {"UnpackCurrentMaster", "cid=5", USER_CALL(o.UnpackCurrentMaster(d, 5, &x.status, &x.user, &x.me))},
     };
 }
+
+#undef USER_CALL
 
 TEST_F(ForwardingTest, EveryOperationReachesItsSlotWithItsArgumentsUnchanged) {
     ControllerObject* object = Make();
