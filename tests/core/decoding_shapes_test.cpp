@@ -3,6 +3,9 @@
 // order, keyed replies, counted arrays and lists into enumerators.
 #include <array>
 #include <cmath>
+#include <map>
+#include <set>
+#include <string>
 #include <span>
 
 #include "core/keyed_text.h"
@@ -54,7 +57,8 @@ TEST_F(DecodingShapesTest, FieldsAreHandedOutInTheirTypes) {
 }
 
 // A refused reply leaves every out-value as it was cleared: nothing is
-// handed out before the whole reply is known good.
+// handed out before the whole reply is known good. Each failure of one
+// decoder reports a line of its own.
 TEST_F(DecodingShapesTest, RefusedRepliesLeaveEveryOutValueCleared) {
     struct Case {
         const char* reply;
@@ -67,16 +71,27 @@ TEST_F(DecodingShapesTest, RefusedRepliesLeaveEveryOutValueCleared) {
         {"-name \"\" -count 1 -colour red -code ab", "Sample failed."},
     };
     ControllerObject* object = Make();
+    std::map<std::string, int> lineOfError;
     for (const Case& c : cases) {
         SCOPED_TRACE(c.reply);
         TestVariant reply = TestVariant::Text(c.reply);
         Decoded d;
         EXPECT_EQ(DecodeSample(*object, reply.Get(), d), E_FAIL);
         EXPECT_TRUE(HasError(c.error));
+        lineOfError.emplace(c.error, Error().line);
         EXPECT_TRUE(d.name.IsNull());
         EXPECT_TRUE(d.code.IsNull());
         EXPECT_EQ(d.count, 0);
         EXPECT_EQ(d.colour, 0);
+    }
+    TestVariant number = TestVariant::Number(1);
+    Decoded d;
+    ASSERT_EQ(DecodeSample(*object, number.Get(), d), E_FAIL);
+    EXPECT_TRUE(HasError("Sample. Not text"));
+    lineOfError.emplace("Sample. Not text", Error().line);
+    std::set<int> lines;
+    for (const auto& [error, line] : lineOfError) {
+        EXPECT_TRUE(lines.insert(line).second) << "\"" << error << "\" reports another failure's line";
     }
 }
 
@@ -110,22 +125,6 @@ TEST_F(DecodingShapesTest, StringsAlreadyHandedOutStayWhenAnAllocationFails) {
     EXPECT_TRUE(HasError("SysAllocString failed"));
     EXPECT_EQ(d.name.Text(), "cell 7");
     EXPECT_TRUE(d.code.IsNull());
-}
-
-TEST_F(DecodingShapesTest, EachFailureOfOneDecoderHasALineOfItsOwn) {
-    ControllerObject* object = Make();
-    std::set<int> lines;
-    for (const char* text : {"-name \"a\" -count x -colour red -code ab", "-name \"a\" -count 1 -colour x -code ab"}) {
-        TestVariant reply = TestVariant::Text(text);
-        Decoded d;
-        ASSERT_EQ(DecodeSample(*object, reply.Get(), d), E_FAIL);
-        lines.insert(Error().line);
-    }
-    TestVariant number = TestVariant::Number(1);
-    Decoded d;
-    ASSERT_EQ(DecodeSample(*object, number.Get(), d), E_FAIL);
-    lines.insert(Error().line);
-    EXPECT_EQ(lines.size(), 3u);
 }
 
 TEST(KeyedText, FindsKeysInOrderAndValuesUpToTheirTab) {

@@ -36,21 +36,14 @@ TEST_F(InitTest, UrlIsOneSlashAndAName) {
     EXPECT_TRUE(HasError("TavController::Init - Invalid URL.", object));
 }
 
-TEST_F(InitTest, HandsTheUrlAndTheCommandComponentToTheUserComponent) {
-    Make();
+TEST_F(InitTest, HandsTheUrlAndTheCommandComponentToTheUserComponentOnce) {
+    ControllerObject* object = Make();
+    EXPECT_EQ(Init(object, "/ctrl"), S_OK) << "the same URL again does nothing";
     EXPECT_EQ(ComponentClass().Creations(), 1);
     EXPECT_EQ(UserClass().Creations(), 1);
     EXPECT_EQ(User().Initializations(), 1);
     EXPECT_EQ(User().InitializedUrl(), "/ctrl");
     EXPECT_EQ(User().InitializedWith(), static_cast<ITavComCtrl*>(&Component()));
-}
-
-TEST_F(InitTest, SameUrlAgainDoesNothing) {
-    ControllerObject* object = Make();
-    EXPECT_EQ(Init(object, "/ctrl"), S_OK);
-    EXPECT_EQ(ComponentClass().Creations(), 1);
-    EXPECT_EQ(UserClass().Creations(), 1);
-    EXPECT_EQ(User().Initializations(), 1);
 }
 
 TEST_F(InitTest, AnotherUrlIsRefusedAndTheFirstBindingStays) {
@@ -75,13 +68,7 @@ TEST_F(InitTest, Command2IsRequiredFromVersion8On) {
         EXPECT_EQ(Init(object, kUrl), E_NOINTERFACE) << "version " << version;
         EXPECT_TRUE(HasError("TavController::Init. Could not create ITavCommand2.", object));
     }
-}
-
-TEST_F(InitTest, ClassObjectStampsTheVersionThatInitChecks) {
-    UseComponents({.command2 = false});
-    EXPECT_EQ(MakeThroughClassObject(7)->Version(), 7);
-    ControllerObject* object = MakeUninitialised(8);
-    EXPECT_EQ(Init(object, kUrl), E_NOINTERFACE);
+    EXPECT_EQ(MakeThroughClassObject(7)->Version(), 7) << "the class object stamps the version that Init checks";
 }
 
 // Each failing step reports its own text and line, keeps no reference on
