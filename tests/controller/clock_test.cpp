@@ -20,40 +20,28 @@ bool Untouched(const FILETIME& time) {
 
 class ClockTest : public ControllerTest {};
 
-TEST_F(ClockTest, GetSystemClockFollowsTheCallPattern) {
-    ExpectCallPattern({.call = [](ControllerObject& object, TavInParams* rip, bool nullOut) {
-                           FILETIME clock{};
-                           return object.GetSystemClock(rip, nullOut ? nullptr : &clock);
-                       },
-                       .invalidParams = "GetSystemClock: Invalid TavInParams",
-                       .beforeInit = "GetSystemClock. Helper used before initialized.",
-                       .nullOut = "GetSystemClock: Invalid out-pointer"});
-}
-
-TEST_F(ClockTest, GetSystemStartupClockFollowsTheCallPattern) {
-    ExpectCallPattern({.call = [](ControllerObject& object, TavInParams* rip, bool nullOut) {
-                           FILETIME clock{};
-                           return object.GetSystemStartupClock(rip, nullOut ? nullptr : &clock);
-                       },
-                       .invalidParams = "GetSystemStartupClock: Invalid TavInParams",
-                       .beforeInit = "GetSystemStartupClock. Helper used before initialized.",
-                       .nullOut = ""});
-}
-
-TEST_F(ClockTest, SetSystemClockFollowsTheCallPattern) {
-    ExpectCallPattern({.call = [](ControllerObject& object, TavInParams* rip, bool) {
-                           return object.SetSystemClock(rip, FileTimeOf(kFirstTicks));
-                       },
-                       .invalidParams = "SetSystemClock: Invalid TavInParams",
-                       .beforeInit = "TavController used before Initialized"});
-}
-
-TEST_F(ClockTest, RestartFollowsTheCallPattern) {
-    ExpectCallPattern({.call = [](ControllerObject& object, TavInParams* rip, bool) {
-                           return object.Restart(rip, WarmStart);
-                       },
-                       .invalidParams = "Restart: Invalid TavInParams",
-                       .beforeInit = "TavController used before Initialized"});
+TEST_F(ClockTest, EveryOperationFollowsTheCallPattern) {
+    const CallPattern patterns[] = {
+        {[](ControllerObject& o, TavInParams* rip, bool nullOut) {
+             FILETIME clock{};
+             return o.GetSystemClock(rip, nullOut ? nullptr : &clock);
+         },
+         "GetSystemClock: Invalid TavInParams", "GetSystemClock. Helper used before initialized.",
+         "GetSystemClock: Invalid out-pointer"},
+        {[](ControllerObject& o, TavInParams* rip, bool nullOut) {
+             FILETIME clock{};
+             return o.GetSystemStartupClock(rip, nullOut ? nullptr : &clock);
+         },
+         "GetSystemStartupClock: Invalid TavInParams", "GetSystemStartupClock. Helper used before initialized.", ""},
+        {[](ControllerObject& o, TavInParams* rip, bool) { return o.SetSystemClock(rip, FileTimeOf(kFirstTicks)); },
+         "SetSystemClock: Invalid TavInParams", "TavController used before Initialized", std::nullopt},
+        {[](ControllerObject& o, TavInParams* rip, bool) { return o.Restart(rip, WarmStart); },
+         "Restart: Invalid TavInParams", "TavController used before Initialized", std::nullopt},
+    };
+    for (const CallPattern& pattern : patterns) {
+        SCOPED_TRACE(pattern.invalidParams);
+        ExpectCallPattern(pattern);
+    }
 }
 
 TEST_F(ClockTest, ClockReadsAreSentAndDecoded) {

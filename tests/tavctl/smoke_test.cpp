@@ -59,18 +59,5 @@ TEST_F(TavctlSmokeTest, TraceShowsWhatWentOverTheWire) {
     EXPECT_EQ(std::string::npos, run.out.find("trace: ")) << "the trace keeps out of standard output";
 }
 
-// With --json each value comes out as one JSON text that a script can read.
-TEST_F(TavctlSmokeTest, JsonValuesAreJson) {
-    const ToolRun run = RunTool("--json batch",
-                                "name set \"Back\\\\slash\tcell\"\n"
-                                "name get\n"
-                                "state get\n"
-                                "clock get --json\n");
-    EXPECT_EQ(0, run.exitCode) << run.output;
-    EXPECT_NE(std::string::npos, run.out.find("\"Back\\\\slash\\tcell\"\n")) << run.output;
-    EXPECT_NE(std::string::npos, run.out.find("\"MotorsOff\"\n")) << run.output;
-    EXPECT_NE(std::string::npos, run.out.find("\"20")) << run.output;
-}
-
 }  // namespace
 }  // namespace tavctl::test
