@@ -46,28 +46,21 @@ TEST_F(ClassVersionE2eTest, EveryTypeFromItsOwnClassOn) {
             ASSERT_EQ(Make(row.fromClass - 1, older), S_OK);
             EXPECT_EQ(Subscribe(older, sink.sink, row.type, &cookie), E_INVALIDARG);
             EXPECT_EQ(cookie, 0u);
-            ComPtr<ITavHelperBase> helper;
-            ASSERT_EQ(older.As(helper), S_OK);
-            Bstr error;
-            helper->GetLastErrorInfo(error.Receive());
-            EXPECT_EQ(Narrow(error).rfind(kUnknownType, 0), 0u) << Narrow(error);
+            EXPECT_EQ(LastErrorOf(older).rfind(kUnknownType, 0), 0u) << LastErrorOf(older);
         }
         ComPtr<ITavController> current;
         ASSERT_EQ(Make(row.fromClass, current), S_OK);
         const HRESULT hr = Subscribe(current, sink.sink, row.type, &cookie);
-        ComPtr<ITavHelperBase> helper;
-        ASSERT_EQ(current.As(helper), S_OK);
-        Bstr error;
-        helper->GetLastErrorInfo(error.Receive());
+        const std::string error = LastErrorOf(current);
         // An event whose subsystem the controller does not have yet is
         // refused by the controller, never as an unknown type.
         if (row.event == nullptr || sim::FindEvent(row.event) != nullptr) {
-            ASSERT_EQ(hr, S_OK) << Narrow(error);
+            ASSERT_EQ(hr, S_OK) << error;
             ComPtr<ITavSubscribe> subscribe;
             ASSERT_EQ(current.As(subscribe), S_OK);
             EXPECT_EQ(subscribe->Unsubscribe(nullptr, cookie), S_OK);
         } else {
-            EXPECT_EQ(Narrow(error).find(kUnknownType), std::string::npos) << Narrow(error);
+            EXPECT_EQ(error.find(kUnknownType), std::string::npos) << error;
         }
     }
 }

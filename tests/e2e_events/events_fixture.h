@@ -1,13 +1,16 @@
 #pragma once
 // A controller object of the newest class on a fresh virtual controller, with
 // a direct hand on that controller's model for the changes no operation
-// makes (the link, the energy state).
+// makes (the link, the energy state) and on its wire for texts the module
+// would never send (which the controller itself must refuse).
 #include <memory>
 #include <string>
 
 #include "e2e/virtual_controller_fixture.h"
-#include "support/event_sink.h"
+#include "sim/command_table.h"
 #include "sim/controller_registry.h"
+#include "sim/status_codes.h"
+#include "support/event_sink.h"
 
 namespace tav::e2e {
 
@@ -35,6 +38,14 @@ public:
         return subscribe->Subscribe(nullptr, &params, cookie);
     }
     HRESULT Unsubscribe(ULONG cookie) { return As<ITavSubscribe>()->Unsubscribe(nullptr, cookie); }
+
+    sim::Reply Send(const char* verb, const char* name, const std::string& args = {}) {
+        const sim::Text v = sim::Widen(verb), n = sim::Widen(name), a = sim::Widen(args);
+        return sim::Dispatch(*Model(), {v, n, a, Url()});
+    }
+    static std::string TextOf(const sim::Reply& reply) { return sim::Narrow(reply.text); }
+    static Bstr Wide(const std::string& text) { return Bstr(text::Widen(text).c_str()); }
+    bool ErrorHas(const std::string& part) { return LastError().find(part) != std::string::npos; }
 
     using VirtualControllerTest::As;
     using VirtualControllerTest::LastError;

@@ -6,9 +6,7 @@
 #include <thread>
 
 #include "e2e_events/events_fixture.h"
-#include "sim/command_table.h"
 #include "sim/file_system.h"
-#include "sim/status_codes.h"
 #include "sim/subsystems/devices.h"
 #include "sim/subsystems/system_jobs.h"
 
@@ -24,11 +22,6 @@ protected:
                          sim::jobs::Job::Inbox}) {
             sim::jobs::SetDuration(*Model(), job, 20ms);
         }
-    }
-
-    sim::Reply Send(const char* verb, const char* name, const std::string& args = {}) {
-        const sim::Text v = sim::Widen(verb), n = sim::Widen(name), a = sim::Widen(args);
-        return sim::Dispatch(*Model(), {v, n, a, Url()});
     }
 
     bool Exists(const std::string& path) {
@@ -62,9 +55,6 @@ protected:
         }
         return true;
     }
-
-    static Bstr Wide(const std::string& text) { return Bstr(text::Widen(text).c_str()); }
-    static std::string TextOf(const sim::Reply& reply) { return sim::Narrow(reply.text); }
 };
 
 }  // namespace tav::e2e
