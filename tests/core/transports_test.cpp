@@ -80,22 +80,6 @@ TEST_F(TransportsTest, TheReplyStringIsHandedOverWhole) {
     EXPECT_NE(Error().line, badLine);
 }
 
-TEST_F(TransportsTest, ACallThroughTheFileInterfaceAdoptsItsErrors) {
-    ControllerObject* object = Make();
-    auto link = [&](TavInParams* rip) {
-        return object->Command(rip)
-            .ThroughFile([&](ITavFile& file, TavCommandReply& reply) { return file.CheckLink(rip, &reply); },
-                         OLESTR("Op. Could not QI ITavFile"))
-            .StatusOnly();
-    };
-    TavInParams rip = SyncCall(2);
-    EXPECT_EQ(link(&rip), S_OK);
-    Component().Fail(ComOperation::CheckLink, E_ACCESSDENIED, "Link refused");
-    EXPECT_EQ(link(&rip), E_ACCESSDENIED);
-    EXPECT_TRUE(HasAdoptedError("Link refused"));
-    EXPECT_EQ(Callback().Last().status, E_ACCESSDENIED);
-}
-
 TEST_F(TransportsTest, WithoutAFileInterfaceTheCallFailsBeforeSending) {
     UseComponents({.file = false});
     ControllerObject* object = MakeUninitialised();
@@ -110,7 +94,7 @@ TEST_F(TransportsTest, WithoutAFileInterfaceTheCallFailsBeforeSending) {
     EXPECT_TRUE(HasError("Op. Could not QI ITavFile", object));
 }
 
-TEST_F(TransportsTest, InternalCommandsGoThroughCommand2WithoutACallback) {
+TEST_F(TransportsTest, InternalCommandsGoThroughCommand2WithoutACallbackAndNeedIt) {
     ControllerObject* object = Make();
     Component().SetExecuteExResult(17);
     ULONG result = 0;
@@ -128,12 +112,9 @@ TEST_F(TransportsTest, InternalCommandsGoThroughCommand2WithoutACallback) {
 
     Component().Fail(ComOperation::ExecuteEx, E_ACCESSDENIED, "refused");
     EXPECT_EQ(object->InternalCommand(OLESTR("CtrlCmd"), OLESTR("-ProxyId 2")), E_ACCESSDENIED);
-}
 
-TEST_F(TransportsTest, InternalCommandsNeedCommand2) {
     UseComponents({.command2 = false});
-    ControllerObject* object = Make(7);
-    EXPECT_EQ(object->InternalCommand(OLESTR("QueueStatus"), OLESTR("")), E_NOINTERFACE);
+    EXPECT_EQ(Make(7)->InternalCommand(OLESTR("QueueStatus"), OLESTR("")), E_NOINTERFACE);
 }
 
 TEST_F(TransportsTest, MessagesGoToTheCommandComponentWhichMayRefuseThem) {

@@ -12,21 +12,22 @@ DWORD PrefixOf(BSTR text) {
     return prefix;
 }
 
+// The byte length stands before the text and a terminator after it; the
+// length is that prefix, not the first terminator.
 TEST(Bstr, StoresByteLengthBeforeTheTextAndATerminatorAfterIt) {
-    BSTR text = SysAllocString(OLESTR("Robot"));
-    ASSERT_NE(text, nullptr);
-    EXPECT_EQ(PrefixOf(text), 10u);
-    EXPECT_EQ(SysStringLen(text), 5u);
-    EXPECT_EQ(SysStringByteLen(text), 10u);
-    EXPECT_EQ(text[5], 0);
-    SysFreeString(text);
-}
+    BSTR robot = SysAllocString(OLESTR("Robot"));
+    ASSERT_NE(robot, nullptr);
+    EXPECT_EQ(PrefixOf(robot), 10u);
+    EXPECT_EQ(SysStringLen(robot), 5u);
+    EXPECT_EQ(robot[5], 0);
+    SysFreeString(robot);
 
-TEST(Bstr, LengthIsThePrefixNotTheFirstTerminator) {
     const OLECHAR withNull[] = {'a', 0, 'b'};
     BSTR text = SysAllocStringLen(withNull, 3);
     ASSERT_NE(text, nullptr);
+    EXPECT_EQ(PrefixOf(text), 6u);
     EXPECT_EQ(SysStringLen(text), 3u);
+    EXPECT_EQ(SysStringByteLen(text), 6u);
     EXPECT_EQ(text[2], 'b');
     EXPECT_EQ(text[3], 0);
     SysFreeString(text);

@@ -45,6 +45,16 @@ public:
     int instancesMade = 0;
 };
 
+template <typename T>
+HRESULT Create(REFCLSID clsid, ComPtr<T>& object) {
+    return CoCreateInstance(clsid, nullptr, CLSCTX_INPROC_SERVER, __uuidof(T), reinterpret_cast<void**>(&object));
+}
+
+HRESULT ClassObject(REFCLSID clsid, ComPtr<IClassFactory>& factory) {
+    return CoGetClassObject(clsid, CLSCTX_INPROC_SERVER, nullptr, __uuidof(IClassFactory),
+                            reinterpret_cast<void**>(&factory));
+}
+
 OleString TestServerPath() {
 #ifdef TAV_PLATFORM_TEST_SERVER
     return tav::test::ExecutableFolder() + Widen(TAV_PLATFORM_TEST_SERVER);
@@ -92,14 +102,10 @@ protected:
 
 TEST_F(ClassLookup, AnUnknownClassIsNotRegistered) {
     ComPtr<IClassFactory> factory;
-    EXPECT_EQ(CoGetClassObject(unregisteredClass, CLSCTX_INPROC_SERVER, nullptr, __uuidof(IClassFactory),
-                               reinterpret_cast<void**>(&factory)),
-              REGDB_E_CLASSNOTREG);
+    EXPECT_EQ(ClassObject(unregisteredClass, factory), REGDB_E_CLASSNOTREG);
     EXPECT_FALSE(factory);
     ComPtr<IUnknown> object;
-    EXPECT_EQ(CoCreateInstance(unregisteredClass, nullptr, CLSCTX_INPROC_SERVER, __uuidof(IUnknown),
-                               reinterpret_cast<void**>(&object)),
-              REGDB_E_CLASSNOTREG);
+    EXPECT_EQ(Create(unregisteredClass, object), REGDB_E_CLASSNOTREG);
 }
 
 TEST_F(ClassLookup, AClassRegisteredInTheProcessIsFoundFirstUntilRevoked) {
@@ -111,17 +117,13 @@ TEST_F(ClassLookup, AClassRegisteredInTheProcessIsFoundFirstUntilRevoked) {
     EXPECT_GT(local.references, 1u);
 
     ComPtr<IUnknown> object;
-    ASSERT_EQ(CoCreateInstance(unregisteredClass, nullptr, CLSCTX_INPROC_SERVER, __uuidof(IUnknown),
-                               reinterpret_cast<void**>(&object)),
-              S_OK);
+    ASSERT_EQ(Create(unregisteredClass, object), S_OK);
     EXPECT_EQ(local.instancesMade, 1);
     object.Reset();
 
     ASSERT_EQ(CoRevokeClassObject(cookie), S_OK);
     EXPECT_EQ(local.references, 1u);
-    EXPECT_NE(CoCreateInstance(unregisteredClass, nullptr, CLSCTX_INPROC_SERVER, __uuidof(IUnknown),
-                               reinterpret_cast<void**>(&object)),
-              S_OK);
+    EXPECT_NE(Create(unregisteredClass, object), S_OK);
     EXPECT_EQ(local.instancesMade, 1);
 }
 
@@ -130,9 +132,7 @@ TEST_F(ClassLookup, ARegisteredServerIsLoadedAndAsked) {
     if (path.empty()) GTEST_SKIP() << "the test server was not built";
     RegisterServer(CLSID_TavTestCounter, path, false);
     ComPtr<ITavTestCounter> counter;
-    ASSERT_EQ(CoCreateInstance(CLSID_TavTestCounter, nullptr, CLSCTX_INPROC_SERVER, __uuidof(ITavTestCounter),
-                               reinterpret_cast<void**>(&counter)),
-              S_OK);
+    ASSERT_EQ(Create(CLSID_TavTestCounter, counter), S_OK);
     EXPECT_EQ(counter->Increment(), 1);
     EXPECT_EQ(counter->Increment(), 2);
 }
@@ -145,15 +145,11 @@ TEST_F(ClassLookup, PerUserRegistrationWinsOverTheMachineOne) {
 
     RegisterServer(CLSID_TavTestCounter, Widen("/nowhere/missing-module"), false);
     RegisterServer(CLSID_TavTestCounter, path, true);
-    EXPECT_EQ(CoGetClassObject(CLSID_TavTestCounter, CLSCTX_INPROC_SERVER, nullptr, __uuidof(IClassFactory),
-                               reinterpret_cast<void**>(&factory)),
-              S_OK);
+    EXPECT_EQ(ClassObject(CLSID_TavTestCounter, factory), S_OK);
 
     RegisterServer(CLSID_TavTestCounter, path, false);
     RegisterServer(CLSID_TavTestCounter, Widen("/nowhere/missing-module"), true);
-    EXPECT_NE(CoGetClassObject(CLSID_TavTestCounter, CLSCTX_INPROC_SERVER, nullptr, __uuidof(IClassFactory),
-                               reinterpret_cast<void**>(&factory)),
-              S_OK);
+    EXPECT_NE(ClassObject(CLSID_TavTestCounter, factory), S_OK);
 }
 
 #ifndef _WIN32
@@ -161,9 +157,7 @@ TEST_F(ClassLookup, PerUserRegistrationWinsOverTheMachineOne) {
 TEST_F(ClassLookup, AServerThatCannotBeLoadedOrAskedIsReported) {
     RegisterServer(unregisteredClass, Widen("/nowhere/missing-module.so"), true);
     ComPtr<IClassFactory> factory;
-    EXPECT_EQ(CoGetClassObject(unregisteredClass, CLSCTX_INPROC_SERVER, nullptr, __uuidof(IClassFactory),
-                               reinterpret_cast<void**>(&factory)),
-              CO_E_DLLNOTFOUND);
+    EXPECT_EQ(ClassObject(unregisteredClass, factory), CO_E_DLLNOTFOUND);
 
     // The platform library loads fine but is no server.
     HMODULE platform = nullptr;
@@ -172,9 +166,7 @@ TEST_F(ClassLookup, AServerThatCannotBeLoadedOrAskedIsReported) {
     OLECHAR platformPath[4096];
     ASSERT_GT(GetModuleFileNameW(platform, platformPath, 4096), 0u);
     RegisterServer(unregisteredClass, platformPath, true);
-    EXPECT_EQ(CoGetClassObject(unregisteredClass, CLSCTX_INPROC_SERVER, nullptr, __uuidof(IClassFactory),
-                               reinterpret_cast<void**>(&factory)),
-              CO_E_ERRORINDLL);
+    EXPECT_EQ(ClassObject(unregisteredClass, factory), CO_E_ERRORINDLL);
 }
 
 TEST_F(ClassLookup, UnusedServersAreUnloadedOnlyWhenTheySaySo) {
@@ -189,9 +181,7 @@ TEST_F(ClassLookup, UnusedServersAreUnloadedOnlyWhenTheySaySo) {
     };
 
     ComPtr<ITavTestCounter> counter;
-    ASSERT_EQ(CoCreateInstance(CLSID_TavTestCounter, nullptr, CLSCTX_INPROC_SERVER, __uuidof(ITavTestCounter),
-                               reinterpret_cast<void**>(&counter)),
-              S_OK);
+    ASSERT_EQ(Create(CLSID_TavTestCounter, counter), S_OK);
     CoFreeUnusedLibraries();
     EXPECT_TRUE(isLoaded()) << "unloaded while an object was alive";
     counter.Reset();

@@ -34,18 +34,29 @@ TEST(Variant, CopyOfABstrIsADeepCopyAndClearFreesBoth) {
     EXPECT_EQ(copy.vt, VT_EMPTY);
 }
 
-TEST(Variant, CopyReleasesWhatTheTargetHeld) {
+// Scalars are copied whole; the string the target held is freed (else the
+// leak checker fails the run).
+TEST(Variant, ScalarsAreCopiedOverWhatTheTargetHeld) {
     VARIANT target;
     VariantInit(&target);
     target.vt = VT_BSTR;
     target.bstrVal = SysAllocString(OLESTR("old"));
-    VARIANT number;
-    VariantInit(&number);
-    number.vt = VT_I4;
-    number.lVal = -7;
-    ASSERT_EQ(VariantCopy(&target, &number), S_OK);
+    VARIANT source;
+    VariantInit(&source);
+    source.vt = VT_I4;
+    source.lVal = -7;
+    ASSERT_EQ(VariantCopy(&target, &source), S_OK);
     EXPECT_EQ(target.vt, VT_I4);
     EXPECT_EQ(target.lVal, -7);
+    source.vt = VT_R8;
+    source.dblVal = 2.5;
+    ASSERT_EQ(VariantCopy(&target, &source), S_OK);
+    EXPECT_EQ(target.vt, VT_R8);
+    EXPECT_EQ(target.dblVal, 2.5);
+    source.vt = VT_BOOL;
+    source.boolVal = VARIANT_TRUE;
+    ASSERT_EQ(VariantCopy(&target, &source), S_OK);
+    EXPECT_EQ(target.boolVal, VARIANT_TRUE);
 }
 
 TEST(Variant, InterfacesAreAddRefedOnCopyAndReleasedOnClear) {
@@ -61,22 +72,6 @@ TEST(Variant, InterfacesAreAddRefedOnCopyAndReleasedOnClear) {
     VariantClear(&copy);
     VariantClear(&source);
     EXPECT_EQ(object.references, 0u);
-}
-
-TEST(Variant, ScalarTypesSurviveACopy) {
-    VARIANT source;
-    VariantInit(&source);
-    source.vt = VT_R8;
-    source.dblVal = 2.5;
-    VARIANT copy;
-    VariantInit(&copy);
-    ASSERT_EQ(VariantCopy(&copy, &source), S_OK);
-    EXPECT_EQ(copy.vt, VT_R8);
-    EXPECT_EQ(copy.dblVal, 2.5);
-    source.vt = VT_BOOL;
-    source.boolVal = VARIANT_TRUE;
-    ASSERT_EQ(VariantCopy(&copy, &source), S_OK);
-    EXPECT_EQ(copy.boolVal, VARIANT_TRUE);
 }
 
 TEST(Variant, UnknownTypeIsRefused) {
