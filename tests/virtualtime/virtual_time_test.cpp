@@ -6,79 +6,67 @@ namespace {
 
 class VirtualTimeTest : public ControllerTest {};
 
-TEST_F(VirtualTimeTest, EveryOperationFollowsTheCallPatternWithItsTexts) {
-    TavVTState state{};
-    ULONG value = 0;
-    const CallPattern patterns[] = {
-        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.VTGetState(r, n ? nullptr : &state); },
-         "VTGetState: Invalid TavInParams", "VTGetState. TavController used before Initialized",
-         "VTGetState: Invalid out-pointer"},
-        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTSetState(r, VTFreeRun); },
-         "VTSetState: Invalid TavInParams", "VTSetState. Helper used before initialized.", std::nullopt},
-        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.VTGetTimeSlice(r, n ? nullptr : &value); },
-         "VTGetTimeSlice: Invalid TavInParams", "VTGetTimeSlice. TavController used before Initialized",
-         "VTGetTimeSlice: Invalid out-pointer"},
-        // The time slice setter reports a missing Init with the state setter's text.
-        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTSetTimeSlice(r, 10); },
-         "VTSetTimeSlice: Invalid TavInParams", "VTSetState. Helper used before initialized.", std::nullopt},
-        // The time getter reports with the time slice getter's texts.
-        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.VTGetTime(r, n ? nullptr : &value); },
-         "VTGetTimeSlice: Invalid TavInParams", "VTGetTimeSlice. TavController used before Initialized",
-         "VTGetTimeSlice: Invalid out-pointer"},
-        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTRun(r); }, "VTRun: Invalid TavInParams",
-         "VTRun. Helper used before initialized.", std::nullopt},
-        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTSetSpeed(r, 2); }, "VTSetSpeed: Invalid TavInParams",
-         "VTSetSpeed. Helper used before initialized.", std::nullopt},
-        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.VTGetSpeed(r, n ? nullptr : &value); },
-         "VTGetSpeed: Invalid TavInParams", "VTGetSpeed. TavController used before Initialized",
-         "VTGetSpeed: Invalid out-pointer"},
-    };
-    Script("VTState", "-VTState Stop");
-    Script("VTTimeSlice", "-time 10");
-    Script("VTTime", "-time 10");
-    Script("VTSpeed", "-speed 1");
-    for (const CallPattern& pattern : patterns) {
-        SCOPED_TRACE(pattern.invalidParams);
-        ExpectCallPattern(pattern);
-    }
-}
-
-TEST_F(VirtualTimeTest, SendsTheCommandTexts) {
+// Each command's text; the first row of an operation also carries the texts
+// of its call pattern.
+TEST_F(VirtualTimeTest, EveryOperationFollowsTheCallPatternAndSendsItsText) {
     struct Case {
-        std::function<HRESULT(ControllerObject&)> call;
+        std::function<HRESULT(ControllerObject&, TavInParams*, bool nullOut)> call;
         const char* verb;
         const char* command;
         const char* args;
+        const char* invalidParams = nullptr;
+        const char* beforeInit = nullptr;
+        const char* nullOut = nullptr;
     };
     TavVTState state{};
     ULONG value = 0;
     const Case cases[] = {
-        {[&](ControllerObject& o) { return o.VTGetState(nullptr, &state); }, "Get", "VTState", ""},
-        {[](ControllerObject& o) { return o.VTSetState(nullptr, VTStop); }, "Set", "VTState", "VTStop"},
-        {[](ControllerObject& o) { return o.VTSetState(nullptr, VTFreeRun); }, "Set", "VTState", "VTFreeRun"},
-        {[](ControllerObject& o) { return o.VTSetState(nullptr, VTRunSlice); }, "Set", "VTState", "VTRunSlice"},
-        {[](ControllerObject& o) { return o.VTSetState(nullptr, VTNextEvent); }, "Set", "VTState", "VTNextEvent"},
-        {[&](ControllerObject& o) { return o.VTGetTimeSlice(nullptr, &value); }, "Get", "VTTimeSlice", ""},
-        {[](ControllerObject& o) { return o.VTSetTimeSlice(nullptr, 4294967295u); }, "Set", "VTTimeSlice",
-         "-time 4294967295"},
-        {[&](ControllerObject& o) { return o.VTGetTime(nullptr, &value); }, "Get", "VTTime", ""},
-        {[](ControllerObject& o) { return o.VTRun(nullptr); }, "Set", "VTRun", ""},
-        {[](ControllerObject& o) { return o.VTSetSpeed(nullptr, 4294967295u); }, "Set", "VTSpeed",
-         "-speed 4294967295"},
-        {[&](ControllerObject& o) { return o.VTGetSpeed(nullptr, &value); }, "Get", "VTSpeed", ""},
+        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.VTGetState(r, n ? nullptr : &state); }, "Get",
+         "VTState", "", "VTGetState: Invalid TavInParams", "VTGetState. TavController used before Initialized",
+         "VTGetState: Invalid out-pointer"},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTSetState(r, VTStop); }, "Set", "VTState", "VTStop"},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTSetState(r, VTFreeRun); }, "Set", "VTState",
+         "VTFreeRun", "VTSetState: Invalid TavInParams", "VTSetState. Helper used before initialized."},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTSetState(r, VTRunSlice); }, "Set", "VTState",
+         "VTRunSlice"},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTSetState(r, VTNextEvent); }, "Set", "VTState",
+         "VTNextEvent"},
+        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.VTGetTimeSlice(r, n ? nullptr : &value); }, "Get",
+         "VTTimeSlice", "", "VTGetTimeSlice: Invalid TavInParams",
+         "VTGetTimeSlice. TavController used before Initialized", "VTGetTimeSlice: Invalid out-pointer"},
+        // The time slice setter reports a missing Init with the state setter's text.
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTSetTimeSlice(r, 4294967295u); }, "Set",
+         "VTTimeSlice", "-time 4294967295", "VTSetTimeSlice: Invalid TavInParams",
+         "VTSetState. Helper used before initialized."},
+        // The time getter reports with the time slice getter's texts.
+        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.VTGetTime(r, n ? nullptr : &value); }, "Get",
+         "VTTime", "", "VTGetTimeSlice: Invalid TavInParams", "VTGetTimeSlice. TavController used before Initialized",
+         "VTGetTimeSlice: Invalid out-pointer"},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTRun(r); }, "Set", "VTRun", "",
+         "VTRun: Invalid TavInParams", "VTRun. Helper used before initialized."},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.VTSetSpeed(r, 4294967295u); }, "Set", "VTSpeed",
+         "-speed 4294967295", "VTSetSpeed: Invalid TavInParams", "VTSetSpeed. Helper used before initialized."},
+        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.VTGetSpeed(r, n ? nullptr : &value); }, "Get",
+         "VTSpeed", "", "VTGetSpeed: Invalid TavInParams", "VTGetSpeed. TavController used before Initialized",
+         "VTGetSpeed: Invalid out-pointer"},
     };
-    Script("VTState", "-VTState Stop");
-    Script("VTTimeSlice", "-time 10");
-    Script("VTTime", "-time 10");
-    Script("VTSpeed", "-speed 1");
-    ControllerObject* object = Make();
     for (const Case& c : cases) {
         SCOPED_TRACE(std::string(c.command) + " " + c.args);
-        ASSERT_EQ(c.call(*object), S_OK);
+        if (c.invalidParams != nullptr) {
+            ExpectCallPattern({c.call, c.invalidParams, c.beforeInit,
+                               c.nullOut ? std::optional<std::string>(c.nullOut) : std::nullopt});
+        }
+        Script("VTState", "-VTState Stop");
+        Script("VTTimeSlice", "-time 10");
+        Script("VTTime", "-time 10");
+        Script("VTSpeed", "-speed 1");
+        ControllerObject* object = Make();
+        ASSERT_EQ(c.call(*object, nullptr, false), S_OK);
         EXPECT_EQ(LastCommand().verb, c.verb);
         EXPECT_EQ(LastCommand().command, c.command);
         EXPECT_EQ(LastCommand().args, c.args);
     }
+    ControllerObject* object = Make();
     EXPECT_EQ(object->VTSetState(nullptr, static_cast<TavVTState>(4)), E_INVALIDARG);
     EXPECT_TRUE(HasError("VTSetState - Unknown state"));
     EXPECT_EQ(object->VTSetState(nullptr, static_cast<TavVTState>(-1)), E_INVALIDARG);
