@@ -39,6 +39,15 @@ protected:
         return ipc->Send(&rip, &params, reinterpret_cast<byte*>(copy.data()), static_cast<LONG>(copy.size()));
     }
 
+    // The IPC interface of another controller object on this test's controller.
+    ComPtr<ITavIPC> Other() {
+        ComPtr<ITavController> object;
+        EXPECT_EQ(Make(17, object), S_OK);
+        ComPtr<ITavIPC> ipc;
+        EXPECT_EQ(object.As(ipc), S_OK);
+        return ipc;
+    }
+
     static HRESULT Receive(ITavIPC* ipc, short slot, std::string& body, TavIPCParams* params = nullptr,
                            ULONG timeOut = 0) {
         TavInParams rip = Sync(timeOut);
@@ -56,11 +65,8 @@ protected:
 };
 
 TEST_F(IpcEndToEndTest, MessagesReachTheSlotOfAnotherObject) {
-    ComPtr<ITavController> other;
-    ASSERT_EQ(Make(17, other), S_OK);
     ComPtr<ITavIPC> sender = As<ITavIPC>();
-    ComPtr<ITavIPC> receiver;
-    ASSERT_EQ(other.As(receiver), S_OK);
+    ComPtr<ITavIPC> receiver = Other();
 
     const short from = Connect(sender.Get(), "cell_a");
     const short to = Connect(receiver.Get(), "cell_b");
@@ -104,11 +110,8 @@ TEST_F(IpcEndToEndTest, AFullQueueHoldsMessagesAtTheControllerUntilThereIsRoom) 
 }
 
 TEST_F(IpcEndToEndTest, SlotsAreRefusedOrClosedByTheirRules) {
-    ComPtr<ITavController> other;
-    ASSERT_EQ(Make(17, other), S_OK);
     ComPtr<ITavIPC> first = As<ITavIPC>();
-    ComPtr<ITavIPC> second;
-    ASSERT_EQ(other.As(second), S_OK);
+    ComPtr<ITavIPC> second = Other();
     const short slot = Connect(first.Get(), "owned");
 
     TavInParams rip = Sync();
@@ -138,10 +141,7 @@ TEST_F(IpcEndToEndTest, ConcurrentSendersLoseNothing) {
     std::vector<std::thread> senders;
     for (int s = 0; s < kSenders; ++s) {
         senders.emplace_back([&, s] {
-            ComPtr<ITavController> own;
-            ASSERT_EQ(Make(17, own), S_OK);
-            ComPtr<ITavIPC> sender;
-            ASSERT_EQ(own.As(sender), S_OK);
+            ComPtr<ITavIPC> sender = Other();
             for (int i = 0; i < kEach; ++i) {
                 ASSERT_EQ(Send(sender.Get(), 0, slot, std::to_string(s)), S_OK);
             }
@@ -162,11 +162,8 @@ TEST_F(IpcEndToEndTest, ConcurrentSendersLoseNothing) {
 }
 
 TEST_F(IpcEndToEndTest, AFastProducerLosesNothingAndKeepsItsOrder) {
-    ComPtr<ITavController> other;
-    ASSERT_EQ(Make(17, other), S_OK);
     ComPtr<ITavIPC> receiver = As<ITavIPC>();
-    ComPtr<ITavIPC> sender;
-    ASSERT_EQ(other.As(sender), S_OK);
+    ComPtr<ITavIPC> sender = Other();
     for (short queue : {short{3}, short{199}}) {
         const short slot = Connect(receiver.Get(), queue == 3 ? "small" : "large", queue);
         constexpr int kMessages = 5000;

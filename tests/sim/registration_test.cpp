@@ -46,13 +46,6 @@ TEST(InProcessRegistration, LastsAsLongAsItsGuard) {
 }
 
 // The module's exports, looked up by name as a COM runtime does.
-struct SimModule {
-    LPFNGETCLASSOBJECT getClassObject = nullptr;
-    LPFNCANUNLOADNOW canUnloadNow = nullptr;
-    HRESULT(STDAPICALLTYPE* registerServer)() = nullptr;
-    HRESULT(STDAPICALLTYPE* unregisterServer)() = nullptr;
-};
-
 template <typename F>
 F Export(void* module, const char* name) {
 #ifdef _WIN32
@@ -104,18 +97,18 @@ TEST(SimModuleTest, RegistersBothClassesAndServesThemThroughTheRegistry) {
     void* handle = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
 #endif
     ASSERT_NE(nullptr, handle);
-    SimModule module{Export<LPFNGETCLASSOBJECT>(handle, "DllGetClassObject"),
-                     Export<LPFNCANUNLOADNOW>(handle, "DllCanUnloadNow"),
-                     Export<HRESULT(STDAPICALLTYPE*)()>(handle, "DllRegisterServer"),
-                     Export<HRESULT(STDAPICALLTYPE*)()>(handle, "DllUnregisterServer")};
-    ASSERT_TRUE(module.getClassObject && module.canUnloadNow && module.registerServer && module.unregisterServer);
+    const auto getClassObject = Export<LPFNGETCLASSOBJECT>(handle, "DllGetClassObject");
+    const auto canUnloadNow = Export<LPFNCANUNLOADNOW>(handle, "DllCanUnloadNow");
+    const auto registerServer = Export<HRESULT(STDAPICALLTYPE*)()>(handle, "DllRegisterServer");
+    const auto unregisterServer = Export<HRESULT(STDAPICALLTYPE*)()>(handle, "DllUnregisterServer");
+    ASSERT_TRUE(getClassObject && canUnloadNow && registerServer && unregisterServer);
 
     ComPtr<IClassFactory> factory;
     EXPECT_EQ(CLASS_E_CLASSNOTAVAILABLE,
-              module.getClassObject(IID_ITavComCtrl, IID_IClassFactory, reinterpret_cast<void**>(&factory)));
-    EXPECT_EQ(S_OK, module.canUnloadNow());
+              getClassObject(IID_ITavComCtrl, IID_IClassFactory, reinterpret_cast<void**>(&factory)));
+    EXPECT_EQ(S_OK, canUnloadNow());
 
-    ASSERT_EQ(S_OK, module.registerServer());
+    ASSERT_EQ(S_OK, registerServer());
     for (const CLSID* clsid : {&CLSID_TavComCtrl, &CLSID_TavUser}) {
         const std::string key = ClassKey(*clsid) + "\\InprocServer32";
         std::error_code error;
@@ -128,18 +121,18 @@ TEST(SimModuleTest, RegistersBothClassesAndServesThemThroughTheRegistry) {
     ComPtr<ITavComCtrl> command;
     ASSERT_EQ(S_OK, CoCreateInstance(CLSID_TavComCtrl, nullptr, CLSCTX_INPROC_SERVER, IID_ITavComCtrl,
                                      reinterpret_cast<void**>(&command)));
-    EXPECT_EQ(S_FALSE, module.canUnloadNow());
+    EXPECT_EQ(S_FALSE, canUnloadNow());
     TavCommandReply reply{};
     const Bstr verb = B("Get"), url = B("/registered"), name = B("Mode");
     EXPECT_EQ(S_OK, command->Execute(nullptr, &reply, verb.Get(), url.Get(), name.Get(), nullptr));
     EXPECT_EQ(T("MANR"), FromBstr(reply.data.bstrVal));
     VariantClear(&reply.data);
     command = nullptr;
-    EXPECT_EQ(S_OK, module.canUnloadNow());
+    EXPECT_EQ(S_OK, canUnloadNow());
 
-    ASSERT_EQ(S_OK, module.unregisterServer());
+    ASSERT_EQ(S_OK, unregisterServer());
     EXPECT_EQ(T("(missing)"), RegistryText(ClassKey(CLSID_TavComCtrl), nullptr));
-    EXPECT_EQ(S_OK, module.unregisterServer());  // nothing left to remove is no failure
+    EXPECT_EQ(S_OK, unregisterServer());  // nothing left to remove is no failure
 #ifndef _WIN32
     TavSetRegistryFile(nullptr);
     std::filesystem::remove_all(registry);
