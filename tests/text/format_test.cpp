@@ -100,13 +100,11 @@ INSTANTIATE_TEST_SUITE_P(
                     FormatCase{"\xF0\x9F\x98\x80|", Format(W("%.2s|"), "\xF0\x9F\x98\x80" "a")},
                     FormatCase{"|", Format(W("%.1s|"), "\xF0\x9F\x98\x80")}));
 
-TEST(Format, AppendsToExistingText) {
+TEST(Format, AppendsOrWritesToABufferCutAndTerminatedLikeSnprintf) {
     OleString text = W("UnpackVTTime. Could not parse: ");
     FormatAppend(text, W("%s."), W("-time x"));
     EXPECT_EQ(N(text), "UnpackVTTime. Could not parse: -time x.");
-}
 
-TEST(Format, FormatToCutsAndTerminatesLikeSnprintf) {
     std::array<OLECHAR, 8> buffer{};
     buffer.fill(u'#');
     EXPECT_EQ(FormatTo(std::span<OLECHAR>(buffer.data(), 6), W("%s-%d"), W("abcd"), 123), 8u);

@@ -119,6 +119,8 @@ std::vector<std::string> Mutations(const std::string& valid, std::uint32_t seed)
 TEST(CompiledScan, ReadsEveryReplyAsTheRuntimeScannerDoes) {
     std::uint32_t seed = 1;
     for (const Grammar& grammar : kGrammars) {
+        Targets valid;
+        EXPECT_GT(grammar.scan(W(grammar.valid), true, valid), 0) << grammar.name << ": the valid reply fails";
         for (const std::string& input : Mutations(grammar.valid, seed++)) {
             const OleString wide = W(input);
             Targets compiled;
@@ -128,13 +130,6 @@ TEST(CompiledScan, ReadsEveryReplyAsTheRuntimeScannerDoes) {
             ASSERT_EQ(compiledResult, runtimeResult) << grammar.name << " on \"" << input << "\"";
             ASSERT_TRUE(compiled == runtime) << grammar.name << " on \"" << input << "\"";
         }
-    }
-}
-
-TEST(CompiledScan, ValidRepliesFillEveryField) {
-    for (const Grammar& grammar : kGrammars) {
-        Targets t;
-        EXPECT_GT(grammar.scan(W(grammar.valid), true, t), 0) << grammar.name;
     }
 }
 

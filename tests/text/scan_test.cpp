@@ -109,24 +109,6 @@ TEST(Scan, WalksAnAutoConditionList) {
     EXPECT_EQ(N(name.data()), "TooLongNam");
 }
 
-TEST(Scan, ReadsNumberAndFlagArrays) {
-    const OleString reply = W("-axes 3[1.5,-2e3,0.000125,]-ssv 4[1011]");
-    std::array<OLECHAR, 16> key{};
-    int count = 0, used = 0;
-    ASSERT_EQ(Scan(reply, W("-%s %d[%n"), key, &count, &used), 2);
-    OleStringView rest = OleStringView(reply).substr(static_cast<std::size_t>(used));
-    std::vector<double> values(3);
-    for (double& value : values) {
-        ASSERT_EQ(Scan(rest, W("%lf,%n"), &value, &used), 1);
-        rest.remove_prefix(static_cast<std::size_t>(used));
-    }
-    EXPECT_EQ(values, (std::vector<double>{1.5, -2000.0, 0.000125}));
-    ASSERT_EQ(Scan(rest.substr(1), W("-%s %d[%n"), key, &count, &used), 2);
-    OLECHAR flag = 0;
-    EXPECT_EQ(Scan(rest.substr(1 + static_cast<std::size_t>(used)), W("%c%n"), &flag, &used), 1);
-    EXPECT_EQ(flag, u'1');
-}
-
 TEST(Scan, ReadsCameraInfoAndWords) {
     // %40s keeps a closing quote; %20[^\"] stops before it.
     std::array<OLECHAR, 41> host{};
