@@ -26,8 +26,6 @@ TEST_F(BackupTest, CommandsFollowTheCallPattern) {
          "TavController::GetVersionInfoFromBackup. TavController used before Initialized",
          "TavController::GetVersionInfoFromBackup: Invalid out-pointer"},
     };
-    Script("BackupState", "-BackupState None");
-    Script("VersionInfoFromBackup", "TavOS 7.4.2");
     for (const CallPattern& pattern : patterns) {
         SCOPED_TRACE(pattern.invalidParams);
         ExpectCallPattern(pattern);

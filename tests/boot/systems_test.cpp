@@ -45,12 +45,6 @@ TEST_F(SystemsTest, CommandsFollowTheCallPatternWithTheirTexts) {
          "UndoLoadBootImage: Invalid TavInParams", "UndoLoadBootImage. TavController used before Initialized",
          std::nullopt},
     };
-    Script("SystemName", "-Name \"SYS_A\"");
-    Script("SelectSystem", "-Name \"SYS_A\"");
-    Script("SystemList", "-NoOfElements 1 -Names SYS_A");
-    Script("BootDevice", "-Name hd0a");
-    Script("SpannedFiles", "-FileCount 2");
-    Script("LoadBootImage", "-IsDone 1");
     for (const CallPattern& pattern : patterns) {
         SCOPED_TRACE(pattern.invalidParams);
         ExpectCallPattern(pattern);

@@ -30,8 +30,6 @@ TEST_F(FilesAndJobsTest, StatusOperationsFollowTheCallPattern) {
          },
          "", "Helper used before initialized.", std::nullopt},
     };
-    Script("SystemDiagnostics", "-pstatus 0");
-    Script("Dorvel", "-pstatus 0");
     for (const CallPattern& pattern : patterns) {
         SCOPED_TRACE(pattern.invalidParams + pattern.beforeInit);
         ExpectCallPattern(pattern);

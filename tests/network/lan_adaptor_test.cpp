@@ -26,10 +26,12 @@ TEST_F(LanAdaptorTest, GettersAndTheMethodSetterFollowTheCallPattern) {
          },
          "GetLANAdaptorInfo: Invalid TavInParams", "GetLANAdaptorInfo. TavController used before Initialized",
          "GetLANAdaptorInfo: Invalid out-pointer"},
+        {[&](ControllerObject& o, TavInParams* r, bool n) {
+             return o.GetLANAdaptorIP(r, &method, a.Out(), n ? nullptr : b.Out(), c.Out());
+         },
+         "GetLANAdaptorIP: Invalid TavInParams", "GetLANAdaptorIP. TavController used before Initialized",
+         "GetLANAdaptorIP: Invalid out-pointer"},
     };
-    Script("LANAdaptorMethod", "-Method DHCP");
-    Script("LANAdaptorIP", "-Address 1.2.3.4 -Submask 255.0.0.0 -Gateway unspec");
-    Script("LANAdaptorInfo", "-Address 1.2.3.4 -Submask 255.0.0.0 -Gateway unspec -Mac 00:11");
     for (const CallPattern& pattern : patterns) {
         SCOPED_TRACE(pattern.invalidParams);
         ExpectCallPattern(pattern);

@@ -6,60 +6,53 @@ namespace {
 
 class SpeedAndPinTest : public ControllerTest {};
 
-using NullableCall = std::function<HRESULT(ControllerObject&, TavInParams*, bool nullOut)>;
-
-TEST_F(SpeedAndPinTest, EveryOperationFollowsTheCallPattern) {
-    short ratio = 0;
-    TavOPModeLockState lock{};
-    const CallPattern patterns[] = {
-        {[](ControllerObject& o, TavInParams* r, bool) { return o.SetSpeedRatio(r, 50); },
-         "SetSpeedRatio: Invalid TavInParams", "SetSpeedRatio. Helper used before initialized.", std::nullopt},
-        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.GetSpeedRatio(r, n ? nullptr : &ratio); },
-         "GetSpeedRatio. Invalid argument.", "TavController used before Initialized",
-         "GetSpeedRatio. Invalid out-parameter."},
-        {[](ControllerObject& o, TavInParams* r, bool) { return o.LockOPModePinCode2(r, 1234, 1); },
-         "LockOPModePinCode: Invalid TavInParams", "TavController used before Initialized", std::nullopt},
-        {[](ControllerObject& o, TavInParams* r, bool) { return o.LockOPModePinCode(r, 1234); },
-         "LockOPModePinCode: Invalid TavInParams", "TavController used before Initialized", std::nullopt},
-        {[](ControllerObject& o, TavInParams* r, bool) { return o.UnlockOPModePinCode(r, 1234); },
-         "UnlockOPModePinCode: Invalid TavInParams", "TavController used before Initialized", std::nullopt},
-        {[&](ControllerObject& o, TavInParams* r, bool n) {
-             return o.GetOPModePinCodeLockState(r, n ? nullptr : &lock);
-         },
-         "GetOPModePinCodeLockState: Invalid TavInParams", "TavController used before initialized",
-         "GetOPModePinCodeLockState: Invalid pointer"},
-    };
-    Script("SpeedAdjust", "50");
-    Script("OPModePinCodeLockState", "-lockstate locked");
-    for (const CallPattern& pattern : patterns) {
-        SCOPED_TRACE(pattern.invalidParams);
-        ExpectCallPattern(pattern);
-    }
-}
-
-TEST_F(SpeedAndPinTest, SendsTheCommandTexts) {
+// Each command's text; the first row of an operation also carries the texts
+// of its call pattern.
+TEST_F(SpeedAndPinTest, EveryOperationFollowsTheCallPatternAndSendsItsText) {
     struct Case {
-        std::function<HRESULT(ControllerObject&)> call;
+        std::function<HRESULT(ControllerObject&, TavInParams*, bool nullOut)> call;
         const char* verb;
         const char* command;
         const char* args;
+        const char* invalidParams = nullptr;
+        const char* beforeInit = "TavController used before Initialized";
+        const char* nullOut = nullptr;
     };
+    short ratio = 0;
+    TavOPModeLockState lock{};
+    const char* lockParams = "LockOPModePinCode: Invalid TavInParams";
     const Case cases[] = {
-        {[](ControllerObject& o) { return o.SetSpeedRatio(nullptr, 100); }, "Set", "SpeedAdjust", "-Value 100"},
-        {[](ControllerObject& o) { return o.SetSpeedRatio(nullptr, 0); }, "Set", "SpeedAdjust", "-Value 0"},
-        {[](ControllerObject& o) { return o.LockOPModePinCode2(nullptr, 7, 5); }, "Set", "LockOPModePinCode",
-         "-pincode 0007 -permanent 1"},
-        {[](ControllerObject& o) { return o.LockOPModePinCode(nullptr, 123456); }, "Set", "LockOPModePinCode",
-         "-pincode 123456 -permanent 0"},
-        {[](ControllerObject& o) { return o.LockOPModePinCode2(nullptr, 4294967295u, -3); }, "Set",
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.SetSpeedRatio(r, 100); }, "Set", "SpeedAdjust",
+         "-Value 100", "SetSpeedRatio: Invalid TavInParams", "SetSpeedRatio. Helper used before initialized."},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.SetSpeedRatio(r, 0); }, "Set", "SpeedAdjust",
+         "-Value 0"},
+        {[&](ControllerObject& o, TavInParams* r, bool n) { return o.GetSpeedRatio(r, n ? nullptr : &ratio); }, "Get",
+         "SpeedAdjust", "", "GetSpeedRatio. Invalid argument.", "TavController used before Initialized",
+         "GetSpeedRatio. Invalid out-parameter."},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.LockOPModePinCode2(r, 7, 5); }, "Set",
+         "LockOPModePinCode", "-pincode 0007 -permanent 1", lockParams},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.LockOPModePinCode2(r, 4294967295u, -3); }, "Set",
          "LockOPModePinCode", "-pincode -0001 -permanent 1"},
-        {[](ControllerObject& o) { return o.UnlockOPModePinCode(nullptr, 42); }, "Set", "UnlockOPModePinCode",
-         "-pincode 0042"},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.LockOPModePinCode(r, 123456); }, "Set",
+         "LockOPModePinCode", "-pincode 123456 -permanent 0", lockParams},
+        {[](ControllerObject& o, TavInParams* r, bool) { return o.UnlockOPModePinCode(r, 42); }, "Set",
+         "UnlockOPModePinCode", "-pincode 0042", "UnlockOPModePinCode: Invalid TavInParams"},
+        {[&](ControllerObject& o, TavInParams* r, bool n) {
+             return o.GetOPModePinCodeLockState(r, n ? nullptr : &lock);
+         },
+         "Get", "OPModePinCodeLockState", "", "GetOPModePinCodeLockState: Invalid TavInParams",
+         "TavController used before initialized", "GetOPModePinCodeLockState: Invalid pointer"},
     };
-    ControllerObject* object = Make();
     for (const Case& c : cases) {
-        SCOPED_TRACE(c.args);
-        ASSERT_EQ(c.call(*object), S_OK);
+        SCOPED_TRACE(std::string(c.command) + " " + c.args);
+        if (c.invalidParams != nullptr) {
+            ExpectCallPattern({c.call, c.invalidParams, c.beforeInit,
+                               c.nullOut ? std::optional<std::string>(c.nullOut) : std::nullopt});
+        }
+        Script("SpeedAdjust", "50");
+        Script("OPModePinCodeLockState", "-lockstate locked");
+        ControllerObject* object = Make();
+        ASSERT_EQ(c.call(*object, nullptr, false), S_OK);
         EXPECT_EQ(LastCommand().verb, c.verb);
         EXPECT_EQ(LastCommand().command, c.command);
         EXPECT_EQ(LastCommand().args, c.args);

@@ -24,9 +24,6 @@ TEST_F(TimeSettingsTest, CommandsFollowTheCallPattern) {
         {[&](ControllerObject& o, TavInParams* r, bool) { return o.TestTimeServer(r, TestBstr("ntp").Get(), &time); },
          "TestTimeServer: Invalid TavInParams", "TavController used before Initialized", std::nullopt},
     };
-    Script("TimeZone", "-timezone CET");
-    Script("TimeServer", "-timeserver ntp");
-    Script("TestTimeServer", "-time_t 5");
     for (const CallPattern& pattern : patterns) {
         SCOPED_TRACE(pattern.invalidParams);
         ExpectCallPattern(pattern);
