@@ -47,6 +47,21 @@ public:
     static Bstr Wide(const std::string& text) { return Bstr(text::Widen(text).c_str()); }
     bool ErrorHas(const std::string& part) { return LastError().find(part) != std::string::npos; }
 
+    // What a getter of interface I hands out; the call must succeed. The
+    // value starts as one no getter gives, so that one left unwritten shows.
+    template <class I, class T>
+    T Fetch(HRESULT (STDMETHODCALLTYPE I::*get)(TavInParams*, T*)) {
+        T value = static_cast<T>(0x5A5A);
+        EXPECT_EQ((As<I>().Get()->*get)(nullptr, &value), S_OK) << LastError();
+        return value;
+    }
+    template <class I>
+    std::string FetchText(HRESULT (STDMETHODCALLTYPE I::*get)(TavInParams*, BSTR*)) {
+        Bstr text;
+        EXPECT_EQ((As<I>().Get()->*get)(nullptr, text.Receive()), S_OK) << LastError();
+        return Narrow(text);
+    }
+
     using VirtualControllerTest::As;
     using VirtualControllerTest::LastError;
     using VirtualControllerTest::Make;

@@ -17,11 +17,7 @@ class NetworkE2eTest : public NetSafetyFixture {
 protected:
     ComPtr<ITavLANAdaptor2> Lan() { return As<ITavLANAdaptor2>(); }
 
-    IPMethod Method() {
-        IPMethod method = static_cast<IPMethod>(9);
-        EXPECT_EQ(Lan()->GetLANAdaptorIPMethod(nullptr, &method), S_OK) << LastError();
-        return method;
-    }
+    IPMethod Method() { return Fetch(&ITavLANAdaptor::GetLANAdaptorIPMethod); }
     Addresses Fixed() {
         Bstr a, m, g;
         EXPECT_EQ(Lan()->GetLANAdaptorIPConfig(nullptr, a.Receive(), m.Receive(), g.Receive()), S_OK) << LastError();

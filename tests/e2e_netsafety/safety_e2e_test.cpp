@@ -69,21 +69,9 @@ class SafetyE2eTest : public NetSafetyFixture {
 protected:
     ComPtr<ITavSafety> Safety() { return As<ITavSafety>(); }
 
-    TavVantorConfigStatus Status() {
-        TavVantorConfigStatus status = static_cast<TavVantorConfigStatus>(99);
-        EXPECT_EQ(Safety()->GetConfigStatus(nullptr, &status), S_OK) << LastError();
-        return status;
-    }
-    TavVantorLoadConfigStatus LoadStatus() {
-        TavVantorLoadConfigStatus status = static_cast<TavVantorLoadConfigStatus>(99);
-        EXPECT_EQ(Safety()->GetLoadOperationStatus(nullptr, &status), S_OK) << LastError();
-        return status;
-    }
-    TavVantorSafetyMode Mode() {
-        TavVantorSafetyMode mode = static_cast<TavVantorSafetyMode>(99);
-        EXPECT_EQ(Safety()->GetSafeyModeStatus(nullptr, &mode), S_OK) << LastError();
-        return mode;
-    }
+    TavVantorConfigStatus Status() { return Fetch(&ITavSafety::GetConfigStatus); }
+    TavVantorLoadConfigStatus LoadStatus() { return Fetch(&ITavSafety::GetLoadOperationStatus); }
+    TavVantorSafetyMode Mode() { return Fetch(&ITavSafety::GetSafeyModeStatus); }
     HRESULT ReadInfo(Info& out) {
         TavVantorConfigInfo info{};
         const HRESULT hr = Safety()->GetSafetyConfigurationInfo(nullptr, &info);

@@ -21,16 +21,8 @@ std::int64_t HostNow() {
 class TimeSettingsE2eTest : public NetSafetyFixture {
 protected:
     ComPtr<ITavControllerTime> Time() { return As<ITavControllerTime>(); }
-    std::string Zone() {
-        Bstr zone;
-        EXPECT_EQ(Time()->GetTimeZone(nullptr, zone.Receive()), S_OK) << LastError();
-        return Narrow(zone);
-    }
-    std::string Server() {
-        Bstr server;
-        EXPECT_EQ(Time()->GetTimeServer(nullptr, server.Receive()), S_OK) << LastError();
-        return Narrow(server);
-    }
+    std::string Zone() { return FetchText(&ITavControllerTime::GetTimeZone); }
+    std::string Server() { return FetchText(&ITavControllerTime::GetTimeServer); }
 };
 
 TEST_F(TimeSettingsE2eTest, ZoneNamesAreJudgedByTheController) {

@@ -72,11 +72,7 @@ protected:
         return two;
     }
     std::string Current(const std::string& camera, std::size_t field) { return Narrow(ByName(camera).curr[field]); }
-    ULONG Count() {
-        ULONG count = 0;
-        EXPECT_EQ(Cameras()->GetNumberOfCameras(nullptr, &count), S_OK) << LastError();
-        return count;
-    }
+    ULONG Count() { return Fetch(&ITavLumeret::GetNumberOfCameras); }
     TavCameraStatus Status(const std::string& camera) {
         TavCameraStatus status = static_cast<TavCameraStatus>(99);
         EXPECT_EQ(Cameras()->GetCameraStatus(nullptr, Wide(camera).Get(), &status), S_OK) << LastError();

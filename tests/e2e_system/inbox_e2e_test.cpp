@@ -9,16 +9,8 @@ class InboxE2eTest : public SystemFixture {
 protected:
     ComPtr<ITavBoot3> Boot() { return As<ITavBoot3>(); }
 
-    TavSysInboxState State() {
-        TavSysInboxState state = TavSysInbox_Undefined;
-        EXPECT_EQ(Boot()->GetSysInboxState(nullptr, &state), S_OK);
-        return state;
-    }
-    bool Busy() {
-        LONG busy = -1;
-        EXPECT_EQ(Boot()->IsInboxBusy(nullptr, &busy), S_OK);
-        return busy == 1;
-    }
+    TavSysInboxState State() { return Fetch(&ITavBoot3::GetSysInboxState); }
+    bool Busy() { return Fetch(&ITavBoot3::IsInboxBusy) == 1; }
     HRESULT Operate(TavInboxOperation operation) { return Boot()->InvokeInboxOperation(nullptr, operation); }
     // Runs an operation that takes time and waits until the inbox is idle.
     HRESULT OperateAndWait(TavInboxOperation operation) {
@@ -48,9 +40,7 @@ protected:
 TEST_F(InboxE2eTest, DeploymentPackageIsInstalledThroughTheInbox) {
     ASSERT_TRUE(sim::PlugDevice(*Model(), OLESTR("usb1")));
     EXPECT_EQ(State(), TavSysInbox_Empty);
-    Bstr path;
-    ASSERT_EQ(Boot()->GetInboxPath(nullptr, path.Receive()), S_OK);
-    EXPECT_EQ(Narrow(path), "/hd0a/inbox");
+    EXPECT_EQ(FetchText(&ITavBoot3::GetInboxPath), "/hd0a/inbox");
 
     ASSERT_EQ(Operate(TavInboxOperation_Open), S_OK);
     EXPECT_EQ(State(), TavSysInbox_Open);

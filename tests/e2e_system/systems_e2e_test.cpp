@@ -10,11 +10,7 @@ class SystemsE2eTest : public SystemFixture {
 protected:
     ComPtr<ITavBoot3> Boot() { return As<ITavBoot3>(); }
 
-    std::string Selected() {
-        Bstr name;
-        EXPECT_EQ(Boot()->GetSelectedSystem(nullptr, name.Receive()), S_OK);
-        return Narrow(name);
-    }
+    std::string Selected() { return FetchText(&ITavBoot::GetSelectedSystem); }
     std::vector<std::string> Systems() {
         TavRetrievalParams retrieval{};
         ComPtr<ITavEnumBSTR> names;
@@ -29,22 +25,12 @@ protected:
         EXPECT_EQ(retrieval.noOfElts, static_cast<LONG>(all.size()));
         return all;
     }
-    std::string BootDevice() {
-        Bstr device;
-        EXPECT_EQ(Boot()->GetBootDevice(nullptr, device.Receive()), S_OK);
-        return Narrow(device);
-    }
-    ULONG Spanned() {
-        ULONG files = 99;
-        EXPECT_EQ(Boot()->GetNoOfSpannedFiles(nullptr, &files), S_OK);
-        return files;
-    }
+    std::string BootDevice() { return FetchText(&ITavBoot::GetBootDevice); }
+    ULONG Spanned() { return Fetch(&ITavBoot::GetNoOfSpannedFiles); }
 };
 
 TEST_F(SystemsE2eTest, SelectingDeselectingAndRemovingFollowTheRules) {
-    Bstr name;
-    ASSERT_EQ(Boot()->GetSystemName(nullptr, name.Receive()), S_OK);
-    EXPECT_EQ(Narrow(name), "MainSystem");
+    EXPECT_EQ(FetchText(&ITavBoot::GetSystemName), "MainSystem");
     EXPECT_EQ(Systems(), (std::vector<std::string>{"MainSystem", "ServiceSystem"}));
     EXPECT_EQ(Selected(), "MainSystem") << "the running system starts next unless another is selected";
 
