@@ -114,17 +114,24 @@ struct Violation {
     short drive = 9;
     LONG capacity = 6;
 
-    HRESULT Unpack(ControllerObject& o, VARIANT* data) {
+    // Calls op with the out-values in the parameters' order.
+    template <class Op>
+    HRESULT Fill(Op op) {
         auto& n = numbers;
         auto& c = numberCounts;
         auto& f = flags;
         auto& k = flagCounts;
         const LONG m = capacity;
-        return o.UnpackSafetyViolationStatus(
-            data, m, &c[0], n[0].data(), m, &c[1], n[1].data(), m, &c[2], n[2].data(), m, &c[3], n[3].data(), m,
-            &c[4], n[4].data(), &number, &type, &instance, &synchronized, &tool, &drive, m, &k[0], f[0].data(), m,
-            &k[1], f[1].data(), m, &k[2], f[2].data(), m, &k[3], f[3].data(), m, &k[4], f[4].data(), m, &k[5],
-            f[5].data(), m, &k[6], f[6].data(), m, &k[7], f[7].data());
+        return op(m, &c[0], n[0].data(), m, &c[1], n[1].data(), m, &c[2], n[2].data(), m, &c[3], n[3].data(), m,
+                  &c[4], n[4].data(), &number, &type, &instance, &synchronized, &tool, &drive, m, &k[0], f[0].data(),
+                  m, &k[1], f[1].data(), m, &k[2], f[2].data(), m, &k[3], f[3].data(), m, &k[4], f[4].data(), m,
+                  &k[5], f[5].data(), m, &k[6], f[6].data(), m, &k[7], f[7].data());
+    }
+    HRESULT Unpack(ControllerObject& o, VARIANT* data) {
+        return Fill([&](auto... out) { return o.UnpackSafetyViolationStatus(data, out...); });
+    }
+    HRESULT Get(ControllerObject& o, LONG driveModule, LONG last) {
+        return Fill([&](auto... out) { return o.GetSafetyViolationStatus(nullptr, driveModule, last, out...); });
     }
 };
 
@@ -183,7 +190,6 @@ TEST_F(SafetyCommandsTest, AMissingArrayLeavesTheFailureInItsCount) {
     EXPECT_EQ(v.Unpack(*object, head.Get()), E_FAIL);
     EXPECT_TRUE(HasError("UnpackLastSafetyViolation failed."));
     EXPECT_EQ(v.number, 0u) << "cleared";
-    TestVariant number = TestVariant::Number(1);
     EXPECT_EQ(v.Unpack(*object, nullptr), E_INVALIDARG);
     EXPECT_TRUE(HasError("UnpackLastSafetyViolation. NULL data-variant"));
 }
@@ -192,17 +198,7 @@ TEST_F(SafetyCommandsTest, ViolationStatusIsAskedOfOneDriveModule) {
     ControllerObject* object = Make();
     Script("VantorViolationInfo", ViolationReply());
     Violation v;
-    auto& n = v.numbers;
-    auto& c = v.numberCounts;
-    auto& f = v.flags;
-    auto& k = v.flagCounts;
-    ASSERT_EQ(object->GetSafetyViolationStatus(nullptr, 2, -1, 6, &c[0], n[0].data(), 6, &c[1], n[1].data(), 6, &c[2],
-                                               n[2].data(), 6, &c[3], n[3].data(), 6, &c[4], n[4].data(), &v.number,
-                                               &v.type, &v.instance, &v.synchronized, &v.tool, &v.drive, 6, &k[0],
-                                               f[0].data(), 6, &k[1], f[1].data(), 6, &k[2], f[2].data(), 6, &k[3],
-                                               f[3].data(), 6, &k[4], f[4].data(), 6, &k[5], f[5].data(), 6, &k[6],
-                                               f[6].data(), 6, &k[7], f[7].data()),
-              S_OK);
+    ASSERT_EQ(v.Get(*object, 2, -1), S_OK);
     EXPECT_EQ(LastCommand().verb, "Get");
     EXPECT_EQ(LastCommand().args, "-driver_module 2 -last_violation -1");
     EXPECT_EQ(v.number, 12u);

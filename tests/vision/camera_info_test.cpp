@@ -1,4 +1,5 @@
 // A camera's information by name: nineteen fields in one grammar.
+#include <algorithm>
 #include <array>
 
 #include "support/controller_test.h"
@@ -22,12 +23,8 @@ struct CameraInfo {
                                    t(11), &confDhcp, t(12), &index, t(13), &status, t(14));
     }
     bool AllCleared() const {
-        for (const TestBstr& text : texts) {
-            if (!text.IsNull()) {
-                return false;
-            }
-        }
-        return currDhcp == 0 && confDhcp == 0 && index == 0 && status == 0;
+        return std::all_of(texts.begin(), texts.end(), [](const TestBstr& text) { return text.IsNull(); }) &&
+               currDhcp == 0 && confDhcp == 0 && index == 0 && status == 0;
     }
 };
 
