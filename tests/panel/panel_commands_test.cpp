@@ -15,7 +15,7 @@ TavCollisionDetectState collision{};
 
 class PanelCommandsTest : public ControllerTest {};
 
-// Each command's text; the first row of an operation also carries the texts
+// Each command's text; one row of each operation also carries the texts
 // of its call pattern (invalidParams, and nullOut with the call that passes
 // a NULL out-pointer).
 TEST_F(PanelCommandsTest, CommandsFollowTheCallPatternAndSendTheirTexts) {

@@ -6,7 +6,7 @@ namespace {
 
 class VirtualTimeTest : public ControllerTest {};
 
-// Each command's text; the first row of an operation also carries the texts
+// Each command's text; one row of each operation also carries the texts
 // of its call pattern.
 TEST_F(VirtualTimeTest, EveryOperationFollowsTheCallPatternAndSendsItsText) {
     struct Case {
