@@ -1,4 +1,6 @@
-// Clock, restart and identity operations end to end against the virtual controller.
+// Clock, restart and identity operations end to end against the virtual
+// controller. That objects of one URL share their controller shows in the
+// IPC and users tests, which need two of them.
 #include "sim/status_codes.h"
 #include "virtual_controller_fixture.h"
 
@@ -88,16 +90,6 @@ TEST_F(ControllerE2eTest, EnvironmentVariablesAreReadAtTheControllersRoot) {
     Bstr unknown(OLESTR("TAV_NO_SUCH_VARIABLE"));
     EXPECT_EQ(controller_->GetEnvironmentVariable(nullptr, unknown.Get(), value.Receive()), sim::kStatusNotFound);
     EXPECT_NE(LastError().find("TavControllerImpl["), std::string::npos) << LastError();
-}
-
-TEST_F(ControllerE2eTest, ObjectsOfOneUrlShareTheController) {
-    Bstr name(OLESTR("shared"));
-    ASSERT_EQ(controller_->SetControllerName(nullptr, name.Get()), S_OK);
-    ComPtr<ITavController> second;
-    ASSERT_EQ(Make(3, second), S_OK);
-    Bstr read;
-    ASSERT_EQ(second->GetControllerName(nullptr, read.Receive()), S_OK);
-    EXPECT_EQ(Narrow(read), "shared");
 }
 
 }  // namespace
