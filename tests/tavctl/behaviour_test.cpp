@@ -1,6 +1,8 @@
-// How the tool behaves across commands: Sync and Async giving the same
-// values, JSON that parses, clients that are separate objects, the wire
-// trace, the event types by name and what a class does not offer.
+// Runs of the tavctl executable against its embedded virtual controller,
+// through the real module, and how the tool behaves across commands: batches,
+// clock times, failures, the wire trace, Sync and Async giving the same
+// values, JSON that parses, clients that are separate objects, the event
+// types by name and what a class does not offer.
 #include <gtest/gtest.h>
 
 #include <sstream>
@@ -23,6 +25,46 @@ std::vector<std::string> Lines(const std::string& text) {
         lines.push_back(line);
     }
     return lines;
+}
+
+TEST_F(BehaviourTest, BatchSetsAndReadsTheControllerName) {
+    const TempFile script("batch.txt",
+                          "# a comment line\n"
+                          "name set \"Smoke test cell\"\n"
+                          "name get\n");
+    const ToolRun run = RunTool("--echo batch \"" + script.Path().string() + "\"");
+    EXPECT_EQ(0, run.exitCode) << run.output;
+    EXPECT_NE(std::string::npos, run.out.find("tavctl> name get\nSmoke test cell\n")) << run.output;
+}
+
+// The clock crosses the tool as ISO-8601 UTC and the module as FILETIME.
+TEST_F(BehaviourTest, ClockTimesSurviveTheRoundTrip) {
+    std::string commands;
+    for (const char* time : {"1970-01-01T00:00:00Z", "2024-02-29T23:59:59Z", "2106-02-07T06:28:15Z"}) {
+        commands += std::string("clock set ") + time + "\nclock get\n";
+    }
+    const ToolRun run = RunTool("batch", commands);
+    EXPECT_EQ(0, run.exitCode) << run.output;
+    // The clock runs on between set and get; a second at most.
+    EXPECT_NE(std::string::npos, run.out.find("1970-01-01T00:00:0")) << run.output;
+    const bool leapDay = run.out.find("2024-02-29T23:59:59Z\n") != std::string::npos ||
+                         run.out.find("2024-03-01T00:00:00Z\n") != std::string::npos;
+    EXPECT_TRUE(leapDay) << run.output;
+    EXPECT_NE(std::string::npos, run.out.find("2106-02-07T06:28:1")) << run.output;
+
+    for (const char* bad : {"2026-02-30T00:00:00Z", "2026-13-01T00:00:00Z", "2026-11-21T02:30:00", "yesterday"}) {
+        EXPECT_EQ(2, RunTool(std::string("clock set ") + bad).exitCode) << bad;
+    }
+}
+
+// --trace shows each command as the controller received and answered it.
+TEST_F(BehaviourTest, TraceShowsWhatWentOverTheWire) {
+    const ToolRun run = RunTool("--trace name set \"Traced cell\"");
+    EXPECT_EQ(0, run.exitCode) << run.output;
+    EXPECT_NE(std::string::npos, run.err.find("trace: ")) << run.output;
+    EXPECT_NE(std::string::npos, run.err.find("CtrlName")) << run.output;
+    EXPECT_NE(std::string::npos, run.err.find("Traced cell")) << run.output;
+    EXPECT_EQ(std::string::npos, run.out.find("trace: ")) << "the trace keeps out of standard output";
 }
 
 // With --async the reply comes through the callback and is decoded by the
@@ -109,7 +151,8 @@ TEST_F(BehaviourTest, ClientOptionAppliesToItsLineAlone) {
 // Failures by their exit status and text: subscriptions by type name (what
 // the class knows is passed on; what it does not know is the module's
 // refusal, an operation failure; a name that is no type is a usage error),
-// interfaces a class does not offer, and the tool's own looks.
+// a failed operation with its HRESULT, name and last error, interfaces a
+// class does not offer, and the tool's own looks.
 TEST_F(BehaviourTest, FailuresByStatusAndText) {
     struct Case {
         const char* arguments;
@@ -126,6 +169,8 @@ TEST_F(BehaviourTest, FailuresByStatusAndText) {
         {"watch --type 4 --timeout 0.1", 2, "unknown event type \"4\""},
         {"watch --type , --timeout 0.1", 2, "unknown event type \"\""},
         {"watch --type \"\" --timeout 0.1", 2, "--type names no event type"},
+        {"--sim-fail CtrlName=0x80070005 name get", 1,
+         "GetControllerName failed: 0x80070005 (E_ACCESSDENIED); last error: CtrlName: simulated failure; "},
         {"--class TavController3 pin state", 1, "class TavController3 does not offer ITavPanel3"},
         {"ls /hd0a/nothing", 1, "ls: no such file or folder \"/hd0a/nothing\""},
         {"ls hd0a/../etc", 1, "ls: no such file or folder"},
