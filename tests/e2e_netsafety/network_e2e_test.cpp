@@ -1,4 +1,6 @@
 // The controller's LAN adaptor through ITavLANAdaptor2.
+#include <functional>
+
 #include "netsafety_fixture.h"
 
 namespace tav::e2e {
@@ -48,42 +50,54 @@ protected:
 const Addresses kDelivered{"192.168.1.50", "255.255.255.0", "192.168.1.1"};
 const Addresses kLease{"172.20.5.37", "255.255.252.0", "172.20.4.1"};
 
+// Each step with the method and the fixed settings it leaves, and what the
+// adaptor then uses: the fixed settings are kept whatever the method and
+// used under FIXIP only, DHCP takes its lease, and off, the controller's
+// "unspec" reaches the client as empty strings.
 TEST_F(NetworkE2eTest, TheMethodDecidesWhatTheAdaptorUses) {
-    std::string mac;
-    EXPECT_EQ(Method(), FIXIP);
-    EXPECT_EQ(Current(&mac), kDelivered);
-    EXPECT_EQ(mac, "00:80:F4:0C:3A:21");
-
-    struct Case {
-        IPMethod method;
-        Addresses current;
+    auto method = [this](IPMethod m) { return [=, this] { return Lan()->SetLANAdaptorIPMethod(nullptr, m); }; };
+    auto fixed = [this](Addresses a) { return [=, this] { return SetFixed(a); }; };
+    // Method and settings in one call; a null text sends no address.
+    auto both = [this](IPMethod m, const char* a, const char* k, const char* g) {
+        return [=, this] {
+            Bstr address = a ? Wide(a) : Bstr(), mask = k ? Wide(k) : Bstr(), gateway = g ? Wide(g) : Bstr();
+            return Lan()->SetLANAdaptorIP(nullptr, m, address.Get(), mask.Get(), gateway.Get());
+        };
     };
-    // Off, nothing is set: the controller's "unspec" reaches the client as
-    // empty strings. The fixed settings stay whatever the method.
-    const Case cases[] = {{NONE, {"", "", ""}}, {DHCP, kLease}, {FIXIP, kDelivered}, {DHCP, kLease}};
-    for (const Case& c : cases) {
-        ASSERT_EQ(Lan()->SetLANAdaptorIPMethod(nullptr, c.method), S_OK) << LastError();
-        EXPECT_EQ(Method(), c.method);
-        EXPECT_EQ(Current(&mac), c.current) << c.method;
-        EXPECT_EQ(mac, "00:80:F4:0C:3A:21") << "the MAC address is never unset";
-        EXPECT_EQ(Fixed(), kDelivered);
-        EXPECT_EQ(Both(), std::make_pair(c.method, kDelivered));
-    }
-}
-
-TEST_F(NetworkE2eTest, FixedSettingsTakeEffectUnderFixIpOnly) {
-    const Addresses noGateway{"10.0.0.5", "255.0.0.0", ""};
-    ASSERT_EQ(SetFixed(noGateway), S_OK) << LastError();
-    EXPECT_EQ(Fixed(), noGateway) << "a gateway not set reads back empty";
-    EXPECT_EQ(Current(), noGateway);
-
-    ASSERT_EQ(Lan()->SetLANAdaptorIPMethod(nullptr, DHCP), S_OK);
+    const Addresses off{"", "", ""};
     const Addresses later{"10.1.2.3", "255.255.0.0", "10.1.0.1"};
-    ASSERT_EQ(SetFixed(later), S_OK) << LastError();
-    EXPECT_EQ(Fixed(), later);
-    EXPECT_EQ(Current(), kLease) << "kept for FIXIP, not used under DHCP";
-    ASSERT_EQ(Lan()->SetLANAdaptorIPMethod(nullptr, FIXIP), S_OK);
-    EXPECT_EQ(Current(), later);
+    const Addresses noGateway{"10.0.0.5", "255.0.0.0", ""};
+    const Addresses oneCall{"10.9.8.6", "255.255.255.0", "10.9.8.1"};
+    struct Step {
+        const char* what;
+        std::function<HRESULT()> set;
+        IPMethod method;
+        Addresses fixed, current;
+    };
+    const Step steps[] = {
+        {"as delivered", [] { return S_OK; }, FIXIP, kDelivered, kDelivered},
+        {"off", method(NONE), NONE, kDelivered, off},
+        {"DHCP", method(DHCP), DHCP, kDelivered, kLease},
+        {"fixed", method(FIXIP), FIXIP, kDelivered, kDelivered},
+        {"DHCP again", method(DHCP), DHCP, kDelivered, kLease},
+        {"fixed settings under DHCP", fixed(later), DHCP, later, kLease},
+        {"fixed again", method(FIXIP), FIXIP, later, later},
+        {"no gateway", fixed(noGateway), FIXIP, noGateway, noGateway},
+        {"off in one call", both(NONE, nullptr, nullptr, nullptr), NONE, noGateway, off},
+        {"DHCP in one call", both(DHCP, "10.9.8.7", "255.255.255.0", nullptr), DHCP,
+         {"10.9.8.7", "255.255.255.0", ""}, kLease},
+        {"fixed in one call", both(FIXIP, "10.9.8.6", "255.255.255.0", "10.9.8.1"), FIXIP, oneCall, oneCall},
+    };
+    for (const Step& step : steps) {
+        SCOPED_TRACE(step.what);
+        ASSERT_EQ(step.set(), S_OK) << LastError();
+        std::string mac;
+        EXPECT_EQ(Method(), step.method);
+        EXPECT_EQ(Fixed(), step.fixed);
+        EXPECT_EQ(Both(), std::make_pair(step.method, step.fixed));
+        EXPECT_EQ(Current(&mac), step.current);
+        EXPECT_EQ(mac, "00:80:F4:0C:3A:21") << "the MAC address is never unset";
+    }
 }
 
 // Settings the module lets through but no network can use.
@@ -114,24 +128,6 @@ TEST_F(NetworkE2eTest, TheControllerRefusesUnusableSettings) {
 
     // A /31 link has no subnet or broadcast address to avoid.
     EXPECT_EQ(SetFixed({"10.0.0.0", "255.255.255.254", "10.0.0.1"}), S_OK) << LastError();
-}
-
-TEST_F(NetworkE2eTest, MethodAndSettingsInOneCall) {
-    auto set = [&](IPMethod method, const char* a, const char* m, const char* g) {
-        Bstr address = a ? Wide(a) : Bstr(), mask = m ? Wide(m) : Bstr(), gateway = g ? Wide(g) : Bstr();
-        return Lan()->SetLANAdaptorIP(nullptr, method, address.Get(), mask.Get(), gateway.Get());
-    };
-    // NONE sends no addresses and keeps the fixed ones.
-    ASSERT_EQ(set(NONE, nullptr, nullptr, nullptr), S_OK) << LastError();
-    EXPECT_EQ(Both(), std::make_pair(NONE, kDelivered));
-    EXPECT_EQ(Current(), (Addresses{"", "", ""}));
-
-    ASSERT_EQ(set(DHCP, "10.9.8.7", "255.255.255.0", nullptr), S_OK) << LastError();
-    EXPECT_EQ(Both(), std::make_pair(DHCP, Addresses{"10.9.8.7", "255.255.255.0", ""}));
-    EXPECT_EQ(Current(), kLease);
-
-    ASSERT_EQ(set(FIXIP, "10.9.8.6", "255.255.255.0", "10.9.8.1"), S_OK) << LastError();
-    EXPECT_EQ(Current(), (Addresses{"10.9.8.6", "255.255.255.0", "10.9.8.1"}));
 }
 
 // The wire as the module writes it, and words the module never sends.
