@@ -43,6 +43,8 @@ TEST_F(SubscriptionsTest, EachTypeReachesTheComponentAsTabled) {
         {SysEnergyState, "SysEnergyStateSub", nullptr, 1, 500},
         {OPModePinCodeLockState, "OPModePinCodeLockState", nullptr, 1, 500},
         {SafetyModeStatus, "SafetyModeStatus", nullptr, 1, 500},
+        // Connection events go through an operation of their own, with no name.
+        {ConnectionEvents, "", nullptr, 0, kForced},
     };
     ControllerObject* object = Make(17);
     for (const HandedOn& row : table) {
@@ -52,21 +54,13 @@ TEST_F(SubscriptionsTest, EachTypeReachesTheComponentAsTabled) {
         ASSERT_EQ(Subscribe(object, row.type, 500, &cookie), S_OK);
         EXPECT_EQ(cookie, 40 + row.type);
         const RecordedSubscription sent = Component().Subscriptions().back();
-        EXPECT_FALSE(sent.connectionEvents);
+        EXPECT_EQ(sent.connectionEvents, row.type == ConnectionEvents);
         EXPECT_EQ(sent.eventName, row.eventName);
         EXPECT_EQ(sent.eventArgs, row.eventArgs ? std::optional<std::string>(row.eventArgs) : std::nullopt);
         EXPECT_EQ(sent.kind, row.kind);
         EXPECT_EQ(sent.eventParams.pollTime, row.pollTime);
         EXPECT_EQ(sent.eventParams.userDef, 77u);
     }
-}
-
-TEST_F(SubscriptionsTest, ConnectionEventsUseTheirOwnOperationWithTheForcedPollTime) {
-    ControllerObject* object = Make();
-    ASSERT_EQ(Subscribe(object, ConnectionEvents), S_OK);
-    const RecordedSubscription sent = Component().Subscriptions().back();
-    EXPECT_TRUE(sent.connectionEvents);
-    EXPECT_EQ(sent.eventParams.pollTime, 2147483647u);
 }
 
 TEST_F(SubscriptionsTest, TypesUnknownOrTooNewForTheClassAreRefused) {
