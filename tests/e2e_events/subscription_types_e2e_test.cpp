@@ -23,8 +23,13 @@ struct WatchedType {
     std::string expected;
 };
 
-std::string Number(HRESULT hr, long value) {
-    return hr == S_OK ? std::to_string(value) : "failed " + std::to_string(hr);
+// The value an Unpack operation of interface I reads from the data, as a
+// number, or its failure.
+template <class I, class T>
+std::string Unpacked(EventsFixture& test, HRESULT (STDMETHODCALLTYPE I::*unpack)(VARIANT*, T*), VARIANT* data) {
+    T value{};
+    const HRESULT hr = (test.As<I>().Get()->*unpack)(data, &value);
+    return hr == S_OK ? std::to_string(static_cast<long>(value)) : "failed " + std::to_string(hr);
 }
 
 const WatchedType kTypes[] = {
@@ -32,27 +37,15 @@ const WatchedType kTypes[] = {
      [](EventsFixture& t, int step) {
          return t.Panel()->SetControllerState(nullptr, step == 0 ? MotorsOn : MotorsOff);
      },
-     [](EventsFixture& t, VARIANT* data) {
-         TavControllerState value{};
-         const HRESULT hr = t.Panel()->UnpackControllerState(data, &value);
-         return Number(hr, value);
-     },
+     [](EventsFixture& t, VARIANT* data) { return Unpacked(t, &ITavPanel::UnpackControllerState, data); },
      std::to_string(MotorsOn)},
     {"mode", mode, 0,
      [](EventsFixture& t, int step) { return t.Panel()->SetOPMode(nullptr, step == 0 ? Manf : Manr); },
-     [](EventsFixture& t, VARIANT* data) {
-         TavOperationMode value{};
-         const HRESULT hr = t.Panel()->UnpackOperationMode(data, &value);
-         return Number(hr, value);
-     },
+     [](EventsFixture& t, VARIANT* data) { return Unpacked(t, &ITavPanel::UnpackOperationMode, data); },
      std::to_string(ManfChange)},
     {"SpeedRatio", SpeedRatio, 0,
      [](EventsFixture& t, int step) { return t.Panel()->SetSpeedRatio(nullptr, step == 0 ? 40 : 60); },
-     [](EventsFixture& t, VARIANT* data) {
-         short value = 0;
-         const HRESULT hr = t.Panel()->UnpackSpeedRatio(data, &value);
-         return Number(hr, value);
-     },
+     [](EventsFixture& t, VARIANT* data) { return Unpacked(t, &ITavPanel::UnpackSpeedRatio, data); },
      "40"},
     {"ConnectionEvents", ConnectionEvents, 1,
      [](EventsFixture& t, int step) {
@@ -91,22 +84,14 @@ const WatchedType kTypes[] = {
          t.Model()->SetEnergyState(step == 0 ? OLESTR("pausing") : OLESTR("paused"));
          return S_OK;
      },
-     [](EventsFixture& t, VARIANT* data) {
-         TavSysEnergyState value{};
-         const HRESULT hr = t.As<ITavController4>()->UnpackSysEnergyState(data, &value);
-         return Number(hr, value);
-     },
+     [](EventsFixture& t, VARIANT* data) { return Unpacked(t, &ITavController4::UnpackSysEnergyState, data); },
      std::to_string(TavSysEnergyStatePausing)},
     {"OPModePinCodeLockState", OPModePinCodeLockState, 0,
      [](EventsFixture& t, int step) {
          return step == 0 ? t.Panel()->LockOPModePinCode2(nullptr, 4711, 1)
                           : t.Panel()->UnlockOPModePinCode(nullptr, 4711);
      },
-     [](EventsFixture& t, VARIANT* data) {
-         TavOPModeLockState value{};
-         const HRESULT hr = t.Panel()->UnpackOPModePinCodeLockState(data, &value);
-         return Number(hr, value);
-     },
+     [](EventsFixture& t, VARIANT* data) { return Unpacked(t, &ITavPanel3::UnpackOPModePinCodeLockState, data); },
      std::to_string(OPModeLockStatePendingPermLocked)},
 };
 

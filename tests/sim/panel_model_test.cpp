@@ -74,20 +74,16 @@ TEST_F(PanelTest, WithoutConditionsTheChangeWaitsForAckAuto) {
     });
 }
 
+// A restart drops a pending change.
 TEST_F(PanelTest, ManualFullSpeedWaitsForAckManf) {
     Play({
+        {"OPMode", "-opmode manf", S_OK, "STAND_BY", "MANF_CH"},
+        {"Restart", "WARM", S_OK, "STAND_BY", "MANR"},
         {"OPMode", "-opmode manf", S_OK, "STAND_BY", "MANF_CH"},
         {"Ack", "MANF", S_OK, "STAND_BY", "MANF"},
         {"Ack", "MANF", kStatusNotAllowed, "STAND_BY", "MANF"},
         {"State", "RUN", S_OK, "RUN", "MANF"},
         {"OPMode", "-opmode manf", S_OK, "RUN", "MANF"},
-    });
-}
-
-TEST_F(PanelTest, RestartDropsAPendingChange) {
-    Play({
-        {"OPMode", "-opmode manf", S_OK, "STAND_BY", "MANF_CH"},
-        {"Restart", "WARM", S_OK, "STAND_BY", "MANR"},
     });
 }
 
