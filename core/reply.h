@@ -45,7 +45,7 @@ public:
     template <class... T>
     [[nodiscard]] Reply& OutPointers(SitedText text, T*... outs) {
         if (!failed()) {
-            if (((outs == nullptr) || ...)) {
+            if ((false || ... || (outs == nullptr))) {
                 Fail(E_POINTER, ViewOf(text.text), text.site);
             } else {
                 (ClearOne(outs), ...);

@@ -1,6 +1,7 @@
 #include "sim/command_table.h"
 
 #include <algorithm>
+#include <cstdint>
 #include <unordered_map>
 #include <vector>
 
@@ -41,11 +42,11 @@ public:
 private:
     struct Hash {
         std::size_t operator()(TextView text) const noexcept {
-            std::size_t hash = 14695981039346656037ull;
+            std::uint64_t hash = 14695981039346656037ull;
             for (OLECHAR c : text) {
                 hash = (hash ^ static_cast<std::uint16_t>(c)) * 1099511628211ull;
             }
-            return hash;
+            return static_cast<std::size_t>(hash ^ (hash >> 32));
         }
     };
     std::unordered_map<TextView, std::vector<const CommandRow*>, Hash> rows_;

@@ -274,6 +274,8 @@ Reply GrantPrivilege(ControllerModel& controller, const Command& command) {
         return Refuse(kStatusBadArgument,
                       OLESTR("RMMPGrant: expected -UserId <id> -Priv 0..2, got ") + Quoted(command.args));
     }
+    const auto grantee = *userId;
+    const auto level = *priv;
     return controller.Update([&](ModelState& state, EventPosts&) {
         UsersState& users = Users(state);
         if (LogonOf(users, command.caller.clientId) == nullptr) {
@@ -282,17 +284,17 @@ Reply GrantPrivilege(ControllerModel& controller, const Command& command) {
         ManualModePrivilege& privilege = users.privilege;
         const Logon* requester = LogonOf(users, privilege.clientId);
         if (privilege.state != PrivilegeState::PendingModify || requester == nullptr ||
-            requester->userId != *userId) {
-            return Refuse(kStatusNotFound, OLESTR("RMMPGrant: user ") + Decimal(*userId) +
+            requester->userId != grantee) {
+            return Refuse(kStatusNotFound, OLESTR("RMMPGrant: user ") + Decimal(grantee) +
                                                OLESTR(" has no pending request"));
         }
         if (privilege.clientId == command.caller.clientId) {
             return Refuse(kStatusNotAllowed, OLESTR("RMMPGrant: a request is granted by another client"));
         }
-        if (*priv == 0) {
+        if (level == 0) {
             privilege = {};  // refused
         } else {
-            privilege.state = *priv == 2 ? PrivilegeState::Exec : PrivilegeState::Modify;
+            privilege.state = level == 2 ? PrivilegeState::Exec : PrivilegeState::Modify;
         }
         return Done();
     });
