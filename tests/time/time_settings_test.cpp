@@ -45,6 +45,7 @@ TEST_F(TimeSettingsTest, ValuesAreSentAsGivenWithinTheirRoom) {
     EXPECT_EQ(object->SetTimeServer(nullptr, TestBstr(std::string(242, 's')).Get()), E_INVALIDARG);
     FILETIME time{};
     EXPECT_EQ(object->TestTimeServer(nullptr, TestBstr(std::string(10000, 's')).Get(), &time), E_INVALIDARG);
+    EXPECT_TRUE(HasError("TestTimeServer: Invalid argument"));
     EXPECT_EQ(CommandCount(), sent);
 }
 
@@ -88,6 +89,9 @@ TEST_F(TimeSettingsTest, TheTestedTimeReadsAsTheControllerClock) {
     EXPECT_EQ(LastCommand().verb, "Set");
     EXPECT_EQ(LastCommand().args, "-timeserver \"ntp\"");
     EXPECT_EQ(TicksOf(time), kUnixEpochTicks + 86400 * kTicksPerSecond);
+    // Its out-pointer is checked after initialisation, unlike the getters'.
+    EXPECT_EQ(object->TestTimeServer(nullptr, TestBstr("ntp").Get(), nullptr), E_POINTER);
+    EXPECT_TRUE(HasError("TestTimeServer: Invalid out-pointer"));
     TestVariant bad = TestVariant::Text("-time 5");
     EXPECT_EQ(object->UnpackTestTimeServer(bad.Get(), &time), E_FAIL);
     EXPECT_TRUE(HasError("UnpackSystemClock. Unsupported time-format."));
