@@ -60,8 +60,8 @@ const CommandIndex& Index() {
 }  // namespace
 
 Reply BadArguments(const Command& command, TextView expected) {
-    return Refuse(kStatusBadArgument, Text(command.name) + OLESTR(": expected ") + Text(expected) + OLESTR(", got ") +
-                                          Quoted(command.args));
+    return Refused(command.name, kStatusBadArgument,
+                   Concat({OLESTR("expected "), expected, OLESTR(", got "), Quoted(command.args)}));
 }
 
 std::span<const Subsystem* const> Subsystems() {

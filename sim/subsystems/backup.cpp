@@ -79,8 +79,7 @@ Reply StartBackup(ControllerModel& controller, const Command& command) {
     const auto path = arguments ? arguments->Find(OLESTR("-Path")) : std::nullopt;
     const auto key = path ? FolderKey(*path) : std::nullopt;
     if (!key) {
-        return Refused(command.name, kStatusBadArgument,
-                       OLESTR("expected -Path \"<folder on the controller>\", got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Path \"<folder on the controller>\""));
     }
     const std::uint64_t ticket = jobs::NextTicket();
     const Reply reply = controller.Update([&](ModelState& state, EventPosts&) {
@@ -192,10 +191,8 @@ Reply RestoreOrCheck(ControllerModel& controller, const Command& command, bool c
         arguments && arguments->Has(OLESTR("-IncludeCtrlSettings")) ? arguments->Signed(OLESTR("-IncludeCtrlSettings"))
                                                                      : std::optional<std::int32_t>(0);
     if (!key || !include || !ignore || !deleteDir || !settings) {
-        return Refused(command.name, kStatusBadArgument,
-                       OLESTR("expected -Path \"<folder>\" -Include <n> -Ignore <n> -DeleteDir <n> "
-                              "[-IncludeCtrlSettings <n>], got ") +
-                           Quoted(command.args));
+        return BadArguments(
+            command, OLESTR("-Path \"<folder>\" -Include <n> -Ignore <n> -DeleteDir <n> [-IncludeCtrlSettings <n>]"));
     }
     const RestoreRequest request{*key, static_cast<std::uint32_t>(*include), static_cast<std::uint32_t>(*ignore),
                                  *deleteDir != 0, *settings != 0};
@@ -230,8 +227,7 @@ Reply VersionInfoFromBackup(ControllerModel& controller, const Command& command)
     const auto path = arguments ? arguments->Find(OLESTR("-BackupPath")) : std::nullopt;
     const auto key = path ? FolderKey(*path) : std::nullopt;
     if (!key) {
-        return Refused(command.name, kStatusBadArgument,
-                       OLESTR("expected -BackupPath \"<folder>\", got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-BackupPath \"<folder>\""));
     }
     return controller.Read([&](const ModelState& state) {
         const FileSystem& files = state.Part<FileSystem>();

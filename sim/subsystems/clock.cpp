@@ -21,8 +21,7 @@ Reply SetSystemClock(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto seconds = arguments ? arguments->Unsigned(OLESTR("-time_t")) : std::nullopt;
     if (!seconds) {
-        return Refuse(kStatusBadArgument, OLESTR("SystemClock: expected -time_t <seconds since 1970>, got \"") +
-                                              Text(command.args) + OLESTR("\""));
+        return BadArguments(command, OLESTR("-time_t <seconds since 1970>"));
     }
     controller.Update([&](ModelState& state, EventPosts&) {
         state.clockOffset += static_cast<std::int64_t>(*seconds) - ControllerModel::Now(state);

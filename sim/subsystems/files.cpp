@@ -94,8 +94,7 @@ Reply Copy(ControllerModel& controller, const Command& command, bool folder) {
     const auto source = arguments ? arguments->Find(OLESTR("-SourcePath")) : std::nullopt;
     const auto destination = arguments ? arguments->Find(OLESTR("-DestPath")) : std::nullopt;
     if (!source || !destination) {
-        return Refused(command.name, kStatusBadArgument,
-                       OLESTR("expected -SourcePath \"<path>\" -DestPath \"<path>\", got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-SourcePath \"<path>\" -DestPath \"<path>\""));
     }
     const auto from = ControllerKey(*source);
     const auto to = ControllerKey(*destination);
@@ -146,7 +145,7 @@ Reply StartDiagnostics(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto path = arguments ? arguments->Find(OLESTR("-Path")) : std::nullopt;
     if (!path) {
-        return Refused(command.name, kStatusBadArgument, OLESTR("expected -Path \"<file>\", got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Path \"<file>\""));
     }
     const auto key = ControllerKey(*path);
     if (!key) {

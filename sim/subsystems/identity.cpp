@@ -8,7 +8,6 @@
 namespace tav::sim {
 namespace {
 
-
 // The value of the first of `keys` present in the argument text.
 std::optional<Text> ValueOf(const Command& command, std::initializer_list<TextView> keys) {
     const auto arguments = Arguments::Parse(command.args);

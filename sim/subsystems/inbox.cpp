@@ -99,7 +99,7 @@ Reply Operate(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto word = arguments ? arguments->Find(OLESTR("-operation")) : std::nullopt;
     if (!word) {
-        return Refused(command.name, kStatusBadArgument, OLESTR("expected -operation <operation>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-operation <operation>"));
     }
     const Text operation(*word);
     const std::uint64_t ticket = jobs::NextTicket();
@@ -198,7 +198,7 @@ std::optional<Text> FolderOf(const Command& command) {
 Reply PreInstallCheck(ControllerModel& controller, const Command& command) {
     const auto folder = FolderOf(command);
     if (!folder) {
-        return Refused(command.name, kStatusBadArgument, OLESTR("expected -path <folder>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-path <folder>"));
     }
     return controller.Read([&](const ModelState& state) {
         Text problem;
@@ -215,7 +215,7 @@ Reply PreInstallCheck(ControllerModel& controller, const Command& command) {
 Reply UpgradeBootServer(ControllerModel& controller, const Command& command) {
     const auto folder = FolderOf(command);
     if (!folder) {
-        return Refused(command.name, kStatusBadArgument, OLESTR("expected -path <folder>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-path <folder>"));
     }
     return controller.Update([&](ModelState& state, EventPosts&) {
         FileSystem& files = state.Part<FileSystem>();

@@ -242,7 +242,7 @@ Reply SetProxy(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto proxy = arguments ? arguments->Signed(OLESTR("-ProxyId")) : std::nullopt;
     if (!proxy || *proxy < 1 || *proxy > 32767) {
-        return Refuse(kStatusBadArgument, OLESTR("CtrlCmd: expected -ProxyId 1..32767, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-ProxyId 1..32767"));
     }
     Router& router = RouterOf(controller);
     std::lock_guard lock(router.mutex);
@@ -256,8 +256,7 @@ Reply Connect(ControllerModel& controller, const Command& command) {
     const auto maxMsg = arguments ? arguments->Signed(OLESTR("-MaxMsg")) : std::nullopt;
     const auto maxSize = arguments ? arguments->Signed(OLESTR("-MaxSize")) : std::nullopt;
     if (!name || name->empty() || !maxMsg || !maxSize) {
-        return Refuse(kStatusBadArgument,
-                      OLESTR("Connect: expected -Name <slot> -MaxMsg <n> -MaxSize <n>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Name <slot> -MaxMsg <n> -MaxSize <n>"));
     }
     const std::int32_t messages = *maxMsg;
     const std::int32_t size = *maxSize;
@@ -308,8 +307,7 @@ Reply Disconnect(ControllerModel& controller, const Command& command) {
 Reply QueueStatus(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     if (!arguments || !arguments->Signed(OLESTR("-Level"))) {
-        return Refuse(kStatusBadArgument,
-                      OLESTR("QueueStatus: expected -SlotId <id> -Level <n> [-QFull], got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-SlotId <id> -Level <n> [-QFull]"));
     }
     const short id = SlotArgument(*arguments);
     Router& router = RouterOf(controller);

@@ -157,8 +157,7 @@ Reply SetMethod(ControllerModel& controller, const Command& command) {
     const auto word = arguments ? arguments->Find(OLESTR("-Method")) : std::nullopt;
     const auto method = word ? MethodOf(*word) : std::nullopt;
     if (!method) {
-        return Refused(OLESTR("LANAdaptorMethod"), kStatusBadArgument,
-                       OLESTR("expected -Method NONE|FIXIP|DHCP, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Method NONE|FIXIP|DHCP"));
     }
     controller.Update([&](ModelState& state, EventPosts&) { state.Part<LanAdaptorState>().method = *method; });
     return Done();
@@ -219,8 +218,7 @@ Reply SetMethodAndSettings(ControllerModel& controller, const Command& command) 
     }
     const auto arguments = Arguments::Parse(rest);
     if (!method || !arguments) {
-        return Refused(kCommand, kStatusBadArgument,
-                       OLESTR("expected -Method NONE|FIXIP|DHCP and the addresses, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Method NONE|FIXIP|DHCP and the addresses"));
     }
     std::optional<Ipv4Settings> fixed;
     if (*method != IpMethod::None) {

@@ -93,7 +93,7 @@ Reply SetOperationMode(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto mode = arguments ? arguments->Find(OLESTR("-opmode")) : std::nullopt;
     if (!mode || (*mode != OLESTR("auto") && *mode != OLESTR("manr") && *mode != OLESTR("manf"))) {
-        return Refuse(kStatusBadArgument, OLESTR("OPMode: expected -opmode auto|manr|manf, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-opmode auto|manr|manf"));
     }
     return controller.Update([&](ModelState& state, EventPosts&) {
         if (ModeIsLocked(state)) {
@@ -150,8 +150,7 @@ Reply SetAutoConditionAck(ControllerModel& controller, const Command& command) {
     const auto answer = arguments ? arguments->Find(OLESTR("-AutoCondAck")) : std::nullopt;
     const auto id = arguments ? arguments->Unsigned(OLESTR("-ID")) : std::nullopt;
     if (!answer || !id || (*answer != OLESTR("Reset") && *answer != OLESTR("Keep"))) {
-        return Refuse(kStatusBadArgument,
-                      OLESTR("AutoCondAck: expected -AutoCondAck Reset|Keep -ID <id>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-AutoCondAck Reset|Keep -ID <id>"));
     }
     const bool keep = *answer == OLESTR("Keep");
     return controller.Update([&](ModelState& state, EventPosts&) {

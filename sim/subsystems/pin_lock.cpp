@@ -49,9 +49,7 @@ Reply Lock(ControllerModel& controller, const Command& command) {
     const auto pin = arguments ? PinOf(*arguments) : std::nullopt;
     const auto permanent = arguments ? arguments->Signed(OLESTR("-permanent")) : std::nullopt;
     if (!pin || !permanent || (*permanent != 0 && *permanent != 1)) {
-        return Refuse(kStatusBadArgument,
-                      OLESTR("LockOPModePinCode: expected -pincode <four or more digits> -permanent 0|1, got ") +
-                          Quoted(command.args));
+        return BadArguments(command, OLESTR("-pincode <four or more digits> -permanent 0|1"));
     }
     return controller.Update([&](ModelState& state, EventPosts&) {
         PinLockState& lock = state.Part<PinLockState>();
@@ -69,9 +67,7 @@ Reply Unlock(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto pin = arguments ? PinOf(*arguments) : std::nullopt;
     if (!pin) {
-        return Refuse(kStatusBadArgument,
-                      OLESTR("UnlockOPModePinCode: expected -pincode <four or more digits>, got ") +
-                          Quoted(command.args));
+        return BadArguments(command, OLESTR("-pincode <four or more digits>"));
     }
     return controller.Update([&](ModelState& state, EventPosts&) {
         PinLockState& lock = state.Part<PinLockState>();

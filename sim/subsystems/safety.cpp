@@ -293,8 +293,8 @@ std::variant<Configuration, Text> ReadConfiguration(const FileSystem& files, Tex
     const auto version = ManifestValue(files, path, "version");
     const auto createdBy = ManifestValue(files, path, "createdby");
     const auto created = ManifestValue(files, path, "created");
-    if (!name || !Fits(*name, kConfigurationNameRoom) || !createdBy || !Fits(*createdBy, kConfigurationNameRoom) || !created ||
-        !Fits(*created, kDateRoom)) {
+    if (!name || !Fits(*name, kConfigurationNameRoom) || !createdBy || !Fits(*createdBy, kConfigurationNameRoom) ||
+        !created || !Fits(*created, kDateRoom)) {
         return Text(OLESTR("lacks a usable name=, createdby= (1 to 63 characters) or created= (1 to 38) line"));
     }
     const std::size_t dot = version ? version->find(OLECHAR('.')) : Text::npos;
@@ -377,15 +377,14 @@ Reply GetSafetyConf(ControllerModel& controller, const Command&) {
 // A change to the configuration in force that records who made it: the name
 // is checked first, then what any change needs, then `change` itself.
 template <typename Change>
-Reply ChangeByName(ControllerModel& controller, const Command& command, TextView commandName, Change change) {
+Reply ChangeByName(ControllerModel& controller, const Command& command, Change change) {
     const auto name = NameArgument(command);
     if (!name) {
-        return Refused(commandName, kStatusBadArgument,
-                       OLESTR("expected -Name \"<1 to 63 characters>\", got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Name \"<1 to 63 characters>\""));
     }
     return controller.Update([&](ModelState& state, EventPosts&) -> Reply {
         SafetyState& safety = state.Part<SafetyState>();
-        if (auto refusal = NotChangeable(commandName, safety)) return std::move(*refusal);
+        if (auto refusal = NotChangeable(command.name, safety)) return std::move(*refusal);
         return change(safety, *safety.inForce, *name, DateText(ControllerModel::Now(state)));
     });
 }
@@ -401,7 +400,7 @@ Reply SetValidated(ControllerModel& controller, const Command& command) {
         c.validationDate = std::move(date);
         return Done();
     };
-    return ChangeByName(controller, command, kCommand, validate);
+    return ChangeByName(controller, command, validate);
 }
 
 Reply SetNotValidated(ControllerModel& controller, const Command&) {
@@ -429,8 +428,7 @@ Reply SetMode(ControllerModel& controller, const Command& command) {
         if (word && *word == known) mode = value;
     }
     if (!mode) {
-        return Refused(kCommand, kStatusBadArgument,
-                       OLESTR("expected -Mode active|commissioning|service, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Mode active|commissioning|service"));
     }
     return controller.Update([&](ModelState& state, EventPosts&) -> Reply {
         SafetyState& safety = state.Part<SafetyState>();
@@ -480,7 +478,7 @@ Reply SyncSoftware(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto number = arguments ? arguments->Signed(OLESTR("-driver_module")) : std::nullopt;
     if (!number) {
-        return Refused(kCommand, kStatusBadArgument, OLESTR("expected -driver_module <n>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-driver_module <n>"));
     }
     return controller.Update([&](ModelState& state, EventPosts&) -> Reply {
         SafetyState& safety = state.Part<SafetyState>();
@@ -502,7 +500,7 @@ Reply LoadFile(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto path = arguments ? arguments->Find(OLESTR("-File")) : std::nullopt;
     if (!path || path->empty()) {
-        return Refused(kCommand, kStatusBadArgument, OLESTR("expected -File \"<path>\", got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-File \"<path>\""));
     }
     return controller.Update([&](ModelState& state, EventPosts&) -> Reply {
         SafetyState& safety = state.Part<SafetyState>();
@@ -545,7 +543,7 @@ Reply LockConfiguration(ControllerModel& controller, const Command& command) {
         c.lockDate = std::move(date);
         return Done();
     };
-    return ChangeByName(controller, command, kCommand, lock);
+    return ChangeByName(controller, command, lock);
 }
 
 Reply UnlockSupervision(ControllerModel& controller, const Command&) {
@@ -592,8 +590,7 @@ Reply GetViolation(ControllerModel& controller, const Command& command) {
     const auto number = arguments ? arguments->Signed(OLESTR("-driver_module")) : std::nullopt;
     const auto last = arguments ? arguments->Signed(OLESTR("-last_violation")) : std::nullopt;
     if (!number || !last) {
-        return Refused(kCommand, kStatusBadArgument,
-                       OLESTR("expected -driver_module <n> -last_violation <0|1>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-driver_module <n> -last_violation <0|1>"));
     }
     return controller.Read([&](const ModelState& state) {
         const SafetyState& safety = state.Part<SafetyState>();

@@ -21,8 +21,7 @@ Reply SetSpeedRatio(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto ratio = arguments ? arguments->Signed(OLESTR("-Value")) : std::nullopt;
     if (!ratio) {
-        return Refuse(kStatusBadArgument,
-                      OLESTR("SpeedAdjust: expected -Value <0 to 100>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Value <0 to 100>"));
     }
     if (*ratio < 0 || *ratio > 100) {
         return Refuse(kStatusBadArgument,

@@ -46,8 +46,7 @@ bool UsableSystemName(TextView name) {
 }
 
 Reply NeedsName(const Command& command) {
-    return Refuse(kStatusBadArgument,
-                  Concat({command.name, OLESTR(": expected -Name \"<name>\", got "), Quoted(command.args)}));
+    return BadArguments(command, OLESTR("-Name \"<name>\""));
 }
 
 Reply GetSystemName(ControllerModel& controller, const Command&) {

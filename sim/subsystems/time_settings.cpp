@@ -129,8 +129,7 @@ Reply GetServer(ControllerModel& controller, const Command&) {
 Reply SetServer(ControllerModel& controller, const Command& command) {
     const auto server = ServerArgument(command);
     if (!server || (!server->empty() && !IsServerName(*server))) {
-        return Refuse(kStatusBadArgument, OLESTR("TimeServer: expected -timeserver \"<host name or address>\", got ") +
-                                              Quoted(command.args));
+        return BadArguments(command, OLESTR("-timeserver \"<host name or address>\""));
     }
     controller.Update([&](ModelState& state, EventPosts&) { state.Part<TimeSettingsState>().server = *server; });
     return Done();
@@ -141,9 +140,7 @@ Reply SetServer(ControllerModel& controller, const Command& command) {
 Reply TestServer(ControllerModel& controller, const Command& command) {
     const auto server = ServerArgument(command);
     if (!server || !IsServerName(*server)) {
-        return Refuse(kStatusBadArgument,
-                      OLESTR("TestTimeServer: expected -timeserver \"<host name or address>\", got ") +
-                          Quoted(command.args));
+        return BadArguments(command, OLESTR("-timeserver \"<host name or address>\""));
     }
     if (!controller.Read([](const ModelState& state) { return LanAdaptorUp(state); })) {
         return Refuse(kStatusNotAllowed, OLESTR("TestTimeServer: the LAN adaptor is off (method NONE)"));

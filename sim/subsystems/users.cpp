@@ -136,7 +136,7 @@ Reply Impersonate(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto userId = arguments ? arguments->Unsigned(OLESTR("-UserId")) : std::nullopt;
     if (!userId) {
-        return Refuse(kStatusBadArgument, OLESTR("Impersonate: expected -UserId <id>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-UserId <id>"));
     }
     return controller.Update([&](ModelState& state, EventPosts&) {
         UsersState& users = Users(state);
@@ -224,7 +224,7 @@ Reply RequestPrivilege(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto priv = arguments ? arguments->Signed(OLESTR("-Priv")) : std::nullopt;
     if (!priv || (*priv != 1 && *priv != 2)) {
-        return Refuse(kStatusBadArgument, OLESTR("RMMPRequest: expected -Priv 1 or 2, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Priv 1 or 2"));
     }
     return controller.Update([&](ModelState& state, EventPosts& posts) {
         UsersState& users = Users(state);
@@ -271,8 +271,7 @@ Reply GrantPrivilege(ControllerModel& controller, const Command& command) {
     const auto userId = arguments ? arguments->Unsigned(OLESTR("-UserId")) : std::nullopt;
     const auto priv = arguments ? arguments->Signed(OLESTR("-Priv")) : std::nullopt;
     if (!userId || !priv || *priv < 0 || *priv > 2) {
-        return Refuse(kStatusBadArgument,
-                      OLESTR("RMMPGrant: expected -UserId <id> -Priv 0..2, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-UserId <id> -Priv 0..2"));
     }
     const auto grantee = *userId;
     const auto level = *priv;

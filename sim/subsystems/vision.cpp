@@ -42,8 +42,8 @@ constexpr std::uint32_t kCameraMask = 0xFFFFFF00u;
 constexpr std::uint32_t kCameraGateway = kCameraNetwork | 1;
 constexpr std::uint32_t kFirstLease = kCameraNetwork | 100;
 
-constexpr std::size_t kCameraNameRoom = 32;   // what a client may send
-constexpr std::size_t kFieldRoom = 40;  // what a client reads of a reply field
+constexpr std::size_t kCameraNameRoom = 32;  // what a client may send
+constexpr std::size_t kFieldRoom = 40;       // what a client reads of a reply field
 
 Camera Delivered(TextView mac, TextView name, CameraState state, std::uint32_t host, bool dhcp) {
     Camera camera;
@@ -199,8 +199,6 @@ TextView StatusWord(CameraState state) {
     return state == CameraState::Program ? TextView(OLESTR("Standby")) : InfoStatusWord(state);
 }
 
-Reply Refused(const Command& command, HRESULT status, TextView why) { return sim::Refused(command.name, status, why); }
-
 // What a command needs of its camera.
 enum class Needs {
     Listed,
@@ -212,13 +210,13 @@ enum class Needs {
 std::optional<Reply> Unmet(const Command& command, const Camera& camera, Needs needs) {
     const Text who = OLESTR("the camera ") + Quoted(camera.name);
     if (needs != Needs::Listed && !Connected(camera)) {
-        return Refused(command, kStatusNotAllowed, who + OLESTR(" is disconnected"));
+        return Refused(command.name, kStatusNotAllowed, who + OLESTR(" is disconnected"));
     }
     if (needs == Needs::Configured && !camera.configured) {
-        return Refused(command, kStatusNotAllowed, who + OLESTR(" is not configured; name it first"));
+        return Refused(command.name, kStatusNotAllowed, who + OLESTR(" is not configured; name it first"));
     }
     if (needs == Needs::NotRunning && camera.state == CameraState::Running) {
-        return Refused(command, kStatusNotAllowed, who + OLESTR(" is running; set it to program state first"));
+        return Refused(command.name, kStatusNotAllowed, who + OLESTR(" is running; set it to program state first"));
     }
     return std::nullopt;
 }
@@ -229,8 +227,7 @@ std::variant<std::size_t, Reply> Locate(const VisionState& vision, const Command
                                         const Arguments& arguments, TextView key) {
     const auto value = arguments.Find(key);
     if (!value) {
-        return Refused(command, kStatusBadArgument, OLESTR("expected ") + Text(key) + OLESTR(", got ") +
-                                                         Quoted(command.args));
+        return BadArguments(command, key);
     }
     if (key == OLESTR("-Camera")) {
         for (std::size_t i = 0; i < vision.cameras.size(); ++i) {
@@ -238,11 +235,11 @@ std::variant<std::size_t, Reply> Locate(const VisionState& vision, const Command
                 return i;
             }
         }
-        return Refused(command, kStatusNotFound, OLESTR("no camera named ") + Quoted(*value));
+        return Refused(command.name, kStatusNotFound, OLESTR("no camera named ") + Quoted(*value));
     }
     const auto index = ParseUnsigned(*value);
     if (!index || *index >= vision.cameras.size()) {
-        return Refused(command, kStatusNotFound, OLESTR("no camera with index ") + Text(*value));
+        return Refused(command.name, kStatusNotFound, OLESTR("no camera with index ") + Text(*value));
     }
     return std::size_t{*index};
 }
@@ -255,7 +252,7 @@ template <bool Changes, typename Use>
 Reply OnCamera(ControllerModel& controller, const Command& command, TextView key, Needs needs, Use use) {
     const auto arguments = Arguments::Parse(command.args);
     if (!arguments) {
-        return Refused(command, kStatusBadArgument, OLESTR("cannot read ") + Quoted(command.args));
+        return Refused(command.name, kStatusBadArgument, OLESTR("cannot read ") + Quoted(command.args));
     }
     auto serve = [&](auto& vision) -> Reply {
         auto located = Locate(vision, command, *arguments, key);
@@ -318,7 +315,7 @@ Reply IsValid(ControllerModel& controller, const Command& command) {
     const auto arguments = Arguments::Parse(command.args);
     const auto name = arguments ? arguments->Find(OLESTR("-Camera")) : std::nullopt;
     if (!name) {
-        return Refused(command, kStatusBadArgument, OLESTR("expected -Camera <name>, got ") + Quoted(command.args));
+        return BadArguments(command, OLESTR("-Camera <name>"));
     }
     const bool known = controller.Read([&](const ModelState& state) {
         for (const Camera& camera : state.Part<VisionState>().cameras) {
@@ -358,13 +355,13 @@ Reply Rename(ControllerModel& controller, const Command& command) {
                     [&](VisionState& vision, Camera& camera, const Arguments& arguments, std::size_t) -> Reply {
                         const TextView name = arguments.Find(OLESTR("-Camera")).value_or(TextView());
                         if (!IsCameraName(name)) {
-                            return Refused(command, kStatusBadArgument,
+                            return Refused(command.name, kStatusBadArgument,
                                            Quoted(name) + OLESTR(" is no camera name (1 to 32 letters, digits, "
                                                                  "'_' or '-')"));
                         }
                         for (const Camera& other : vision.cameras) {
                             if (&other != &camera && other.name == name) {
-                                return Refused(command, kStatusNotAllowed,
+                                return Refused(command.name, kStatusNotAllowed,
                                                OLESTR("another camera is named ") + Quoted(name));
                             }
                         }
@@ -383,9 +380,7 @@ Reply SetCameraState(ControllerModel& controller, const Command& command) {
                     [&](VisionState&, Camera& camera, const Arguments& arguments, std::size_t) -> Reply {
                         const auto number = arguments.Unsigned(OLESTR("-State"));
                         if (!number || (*number != 1 && *number != 2)) {
-                            return Refused(command, kStatusBadArgument,
-                                           OLESTR("expected -State 1 (program) or 2 (running), got ") +
-                                               Quoted(command.args));
+                            return BadArguments(command, OLESTR("-State 1 (program) or 2 (running)"));
                         }
                         camera.state = *number == 1 ? CameraState::Program : CameraState::Running;
                         return Done();
@@ -402,16 +397,14 @@ Reply SetIp(ControllerModel& controller, const Command& command) {
             const auto gatewayText = arguments.Find(OLESTR("-Gateway"));
             const auto gateway = gatewayText && !gatewayText->empty() ? ParseIpv4(*gatewayText) : std::nullopt;
             if (!address || !mask || !gatewayText || (!gatewayText->empty() && !gateway)) {
-                return Refused(command, kStatusBadArgument,
-                               OLESTR("expected -Address A -Subnetmask M -Gateway G in IPv4 form, got ") +
-                                   Quoted(command.args));
+                return BadArguments(command, OLESTR("-Address A -Subnetmask M -Gateway G in IPv4 form"));
             }
             const Ipv4Settings settings{*address, *mask, gateway};
             if (const auto why = Ipv4Refusal(settings)) {
-                return Refused(command, kStatusBadArgument, *why);
+                return Refused(command.name, kStatusBadArgument, *why);
             }
             if (AddressTaken(vision, camera, *address)) {
-                return Refused(command, kStatusNotAllowed,
+                return Refused(command.name, kStatusNotAllowed,
                                OLESTR("another camera uses the address ") + Ipv4Text(*address));
             }
             camera.settings.ip = settings;
@@ -441,10 +434,8 @@ Reply SetDns(ControllerModel& controller, const Command& command) {
             const auto server = serverText && !serverText->empty() ? ParseIpv4(*serverText) : std::nullopt;
             if (!serverText || !suffix || (!serverText->empty() && !server) ||
                 (!suffix->empty() && (!IsWord(*suffix, kFieldRoom) || *suffix == kUnspecified))) {
-                return Refused(command, kStatusBadArgument,
-                               OLESTR("expected -DNSServer <IPv4 address> -DNSSuffix <domain of at most 40 "
-                                      "characters>, got ") +
-                                   Quoted(command.args));
+                return BadArguments(command,
+                                    OLESTR("-DNSServer <IPv4 address> -DNSSuffix <domain of at most 40 characters>"));
             }
             camera.settings.dnsServer = server;
             camera.settings.dnsSuffix = Text(*suffix);
@@ -469,10 +460,8 @@ Reply SetCredentials(ControllerModel& controller, const Command& command) {
                         const auto password = arguments.Find(OLESTR("-Password"));
                         if (!user || !IsWord(*user, kFieldRoom) || !password ||
                             (!password->empty() && !IsWord(*password, kFieldRoom))) {
-                            return Refused(command, kStatusBadArgument,
-                                           OLESTR("expected -Username <1 to 40 characters> -Password <at most 40>, "
-                                                  "got ") +
-                                               Quoted(command.args));
+                            return BadArguments(command,
+                                                OLESTR("-Username <1 to 40 characters> -Password <at most 40>"));
                         }
                         camera.user = Text(*user);
                         camera.password = Text(*password);
