@@ -67,39 +67,19 @@ TEST_F(SubscriptionTest, UnsubscribeStopsDeliveryAndReleasesTheSink) {
 }
 
 // Unsubscribes from inside its own OnChange.
-class UnsubscribingSink final : public _ITavObjectEvents {
-public:
-    HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override {
-        *object = riid == IID_IUnknown || riid == IID__ITavObjectEvents ? this : nullptr;
-        return *object ? (AddRef(), S_OK) : E_NOINTERFACE;
-    }
-    HRESULT STDMETHODCALLTYPE OnChange(TavEventData*) override {
-        ++calls;
-        return command->Unsubscribe(nullptr, cookie);
-    }
-    TAV_TEST_DOUBLE_REFCOUNT
-
-    ITavComCtrl* command = nullptr;
-    ULONG cookie = 0;
-    std::atomic<int> calls{0};
-
-private:
-    tav::test::RefCount refs_;
-};
-
 TEST_F(SubscriptionTest, SinkMayUnsubscribeFromItsOwnOnChange) {
     ASSERT_EQ(S_OK, Get("State").status);
-    auto* sink = new UnsubscribingSink;
-    sink->command = command_.Get();
-    sink->cookie = Subscribe(sink, "State");
+    tav::test::SinkRef sink;
+    ULONG cookie = 0;
+    std::atomic<HRESULT> unsubscribed{E_UNEXPECTED};
+    sink->onChange = [&] { unsubscribed = command_->Unsubscribe(nullptr, cookie); };
+    cookie = Subscribe(sink.sink, "State");
     ASSERT_EQ(S_OK, Set("State", "RUN").status);
-    for (int i = 0; i < 500 && sink->calls == 0; ++i) {
-        std::this_thread::sleep_for(10ms);
-    }
+    ASSERT_TRUE(sink->WaitFor(1));
+    EXPECT_EQ(S_OK, unsubscribed.load());
     ASSERT_EQ(S_OK, Set("State", "STAND_BY").status);
     std::this_thread::sleep_for(200ms);
-    EXPECT_EQ(1, sink->calls.load());
-    sink->Release();
+    EXPECT_EQ(1u, sink->Count());
 }
 
 TEST_F(SubscriptionTest, SubscriptionsNeedAKnownEventAKnownKindAndAController) {

@@ -5,6 +5,7 @@
 #include <atomic>
 #include <chrono>
 #include <condition_variable>
+#include <functional>
 #include <mutex>
 #include <string>
 #include <vector>
@@ -42,6 +43,9 @@ public:
     TAV_TEST_DOUBLE_REFCOUNT
 
     HRESULT STDMETHODCALLTYPE OnChange(TavEventData* event) override {
+        if (onChange) {
+            onChange();
+        }
         ReceivedEvent received;
         received.userDef = event->userDef;
         received.type = event->Data.vt;
@@ -75,6 +79,9 @@ public:
         std::lock_guard hold(mutex_);
         return events_.size();
     }
+
+    // What a client does inside its handler (set before subscribing).
+    std::function<void()> onChange;
 
 private:
     ~EventSink() = default;
