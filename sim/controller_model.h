@@ -62,9 +62,13 @@ public:
     }
 
     // Calls change(ModelState&, EventPosts&) under the lock, then tells the
-    // listeners, and returns what change returned.
+    // listeners, and returns what change returned. Changes are told in the
+    // order they were made, each before the next one is made: a value event
+    // sees every state a change left, even when a second change follows at
+    // once from another thread, and pulse events keep their order.
     template <typename F>
     decltype(auto) Update(F&& change) {
+        std::lock_guard order(publishMutex_);
         EventPosts posts;
         using Result = std::invoke_result_t<F, ModelState&, EventPosts&>;
         if constexpr (std::is_void_v<Result>) {
@@ -119,6 +123,8 @@ private:
     std::mutex sharedMutex_;
     StateParts shared_;
 
+    // Taken before mutex_ and held until the listeners have been told.
+    std::mutex publishMutex_;
     std::mutex listenersMutex_;
     std::vector<std::weak_ptr<ModelListener>> listeners_;
 };

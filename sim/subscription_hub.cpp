@@ -66,10 +66,6 @@ SubscriptionHub::~SubscriptionHub() { Stop(); }
 
 ULONG SubscriptionHub::Add(SubscriptionRequest request) {
     Subscription subscription;
-    if (request.event->style == EventStyle::Value) {
-        subscription.lastQueued = controller_->Read(
-            [&](const ModelState& state) { return request.event->current(state, request.eventArgs); });
-    }
     if (auto greeting = GreetingOf(*request.event, *controller_)) {
         subscription.queued.push_back(std::move(*greeting));
     }
@@ -82,27 +78,33 @@ ULONG SubscriptionHub::Add(SubscriptionRequest request) {
     subscription.request = std::move(request);
 
     ULONG cookie = 0;
-    bool firstListener = false;
     {
+        // The hub listens, and a value is taken as the one last told, under
+        // the hub's lock: a change made meanwhile is either in that value or
+        // told to the hub after it, never lost in between.
         std::lock_guard lock(mutex_);
         if (stopping_) {
             return 0;
+        }
+        if (!listening_) {
+            listening_ = true;
+            controller_->AddListener(shared_from_this());
+        }
+        const SubscriptionRequest& added = subscription.request;
+        if (added.event->style == EventStyle::Value) {
+            subscription.lastQueued = controller_->Read(
+                [&](const ModelState& state) { return added.event->current(state, added.eventArgs); });
         }
         cookie = nextCookie_++;
         if (nextCookie_ == 0) {
             nextCookie_ = 1;
         }
         subscriptions_.emplace(cookie, std::move(subscription));
-        firstListener = !listening_;
-        listening_ = true;
         if (!thread_.joinable()) {
             thread_ = std::thread([self = shared_from_this()] { self->Run(); });
         }
     }
     wake_.notify_all();
-    if (firstListener) {
-        controller_->AddListener(shared_from_this());
-    }
     return cookie;
 }
 
