@@ -152,6 +152,11 @@ HRESULT DecodeList(Reply& reply, const ListTexts& texts, const ListShape& shape,
         out);
 }
 
+// The retrieve-all request: the only retrieval the lists take, written as
+// -2 by most of them and as -1 by the IPC slot list.
+inline constexpr LONG kRetrieveAll = -2;
+inline constexpr LONG kRetrieveAllSlots = -1;
+
 // A complete list as the retrieve-all request reports it.
 inline void SetRetrieved(TavRetrievalParams* params, LONG count) {
     params->noOfElts = count;

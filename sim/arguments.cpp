@@ -3,7 +3,6 @@
 namespace tav::sim {
 namespace {
 
-
 // "-Name" starts a key; "-1" is a negative number.
 bool StartsKey(TextView rest) { return rest.size() >= 2 && rest[0] == OLECHAR('-') && !IsDigit(rest[1]); }
 

@@ -22,7 +22,7 @@ constexpr WordValue<TavBackupEvent> kEventWords[] = {{OLESTR("Finished"), Backup
                                                      {OLESTR("Error"), BackupEvent_Error}};
 
 constexpr WordValue<TavBackupState> kBackupStateWords[] = {{OLESTR("None"), BackupState_None},
-                                                     {OLESTR("InProgress"), BackupState_InProgress}};
+                                                           {OLESTR("InProgress"), BackupState_InProgress}};
 
 }  // namespace
 

@@ -7,10 +7,10 @@ namespace tav {
 namespace {
 
 constexpr WordValue<TavSysInboxState> kInboxStateWords[] = {{OLESTR("error"), TavSysInbox_Error},
-                                                       {OLESTR("empty"), TavSysInbox_Empty},
-                                                       {OLESTR("open"), TavSysInbox_Open},
-                                                       {OLESTR("loaded"), TavSysInbox_Loaded},
-                                                       {OLESTR("committed"), TavSysInbox_Committed}};
+                                                            {OLESTR("empty"), TavSysInbox_Empty},
+                                                            {OLESTR("open"), TavSysInbox_Open},
+                                                            {OLESTR("loaded"), TavSysInbox_Loaded},
+                                                            {OLESTR("committed"), TavSysInbox_Committed}};
 
 // The operations and file types are kept as 8-bit texts, widened when sent.
 constexpr const char* kOperations[] = {"clear", "open", "precheck", "load_completed", "apply_update"};
@@ -71,7 +71,8 @@ HRESULT UnpackSysInboxState(ControllerObject& object, VARIANT* data, TavSysInbox
         .OutPointer(state, OLESTR("UnpackSysInboxState. Invalid out pointer"))
         .IsBstr(OLESTR("UnpackSysInboxState. Data-variant not of type VT_BSTR"))
         .Fields<OLESTR("-state %16s")>(OLESTR("UnpackSysInboxState failed."),
-                                       fields::MappedOr<TavSysInboxState>{state, kInboxStateWords, TavSysInbox_Undefined});
+                                       fields::MappedOr<TavSysInboxState>{state, kInboxStateWords,
+                                                                          TavSysInbox_Undefined});
 }
 
 // Busy is exactly "true"; anything else is not busy.

@@ -9,13 +9,11 @@
 namespace tav {
 namespace {
 
-constexpr LONG kDevicesRetrieveAll = -2;
-
 constexpr WordValue<TavStorageDeviceType> kDeviceTypeWords[] = {{OLESTR("Unknown"), StorageDeviceType_Unknown},
-                                                          {OLESTR("Removable"), StorageDeviceType_Removable},
-                                                          {OLESTR("Ramdisk"), StorageDeviceType_Ramdisk},
-                                                          {OLESTR("Remote"), StorageDeviceType_Remote},
-                                                          {OLESTR("Fixed"), StorageDeviceType_Fixed}};
+                                                                {OLESTR("Removable"), StorageDeviceType_Removable},
+                                                                {OLESTR("Ramdisk"), StorageDeviceType_Ramdisk},
+                                                                {OLESTR("Remote"), StorageDeviceType_Remote},
+                                                                {OLESTR("Fixed"), StorageDeviceType_Fixed}};
 
 struct DeviceListTexts {
     const OLECHAR* nullVariant;
@@ -110,7 +108,7 @@ HRESULT ControllerObject::GetStorageDevices(TavInParams* rip, TavRetrievalParams
         .Initialised(OLESTR("Helper used before initialized."))
         .OutPointers(OLESTR(""), retrieval, devices)
         .Clear(devices)
-        .Require([&] { return retrieval->noOfElts == kDevicesRetrieveAll; }, E_INVALIDARG,
+        .Require([&] { return retrieval->noOfElts == kRetrieveAll; }, E_INVALIDARG,
                  OLESTR("GetStorageDevice - Only the RetrieveAll retrieval mode is supported."))
         .Get(OLESTR("StorageDevice"))
         .Decode([&](VARIANT* reply) { return UnpackStorageDevices(reply, retrieval, devices); });
@@ -137,7 +135,7 @@ HRESULT ControllerObject::GetStorageDevices2(TavInParams* rip, TavRetrievalParam
         .Initialised(OLESTR("Helper used before initialized."))
         .OutPointers(OLESTR(""), retrieval, devices)
         .Clear(devices)
-        .Require([&] { return retrieval->noOfElts == kDevicesRetrieveAll; }, E_INVALIDARG,
+        .Require([&] { return retrieval->noOfElts == kRetrieveAll; }, E_INVALIDARG,
                  OLESTR("GetStorageDevice - Only the RetrieveAll retrieval mode is supported."))
         .Get(OLESTR("StorageDevice2"))
         .Decode([&](VARIANT* reply) { return UnpackStorageDevices2(reply, retrieval, devices); });

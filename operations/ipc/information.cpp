@@ -12,7 +12,6 @@
 namespace tav {
 namespace {
 
-constexpr LONG kSlotsRetrieveAll = -1;
 constexpr LONG kNoCommandType = 0;
 
 constexpr ListTexts kSlotListTexts{OLESTR(""), OLESTR("UnpackSlotInformation - Could not parse out element: %s"),
@@ -91,7 +90,7 @@ HRESULT ControllerObject::GetSlotInformation(TavInParams* rip, TavRetrievalParam
         .ValidParams(OLESTR("GetSlotInformation: Invalid TavInParams"))
         .OutPointer(slots, OLESTR("GetSlotInformation: Invalid pointer to interface IEnumSlots"))
         .Initialised(OLESTR("TavController used before Initialized"))
-        .RetrievalParams(retrieval, kSlotsRetrieveAll, OLESTR("GetSlotInformations: Invalid TavRetreivalParams"),
+        .RetrievalParams(retrieval, kRetrieveAllSlots, OLESTR("GetSlotInformations: Invalid TavRetreivalParams"),
                          OLESTR("GetSlotInformation: Invalid TavRetrievalParams, only RetrieveAll supported"))
         .Get(OLESTR("SlotInfo"))
         .Decode([&](VARIANT* reply) { return UnpackSlotInformation(reply, retrieval, slots); });

@@ -8,8 +8,6 @@
 namespace tav {
 namespace {
 
-constexpr LONG kUnitsRetrieveAll = -2;
-
 constexpr ListTexts kUnitListTexts{OLESTR(""), OLESTR("UnpackPSCUnitStatus. Could not parse out element: %s"),
                                    OLESTR("UnpackPSCUnitStatus. Can't create enum object!"),
                                    OLESTR("UnpackPSCUnitStatus. Can't initialize the enum object"),
@@ -26,7 +24,7 @@ HRESULT ControllerObject::GetPSCUnitStatus(TavInParams* rip, TavRetrievalParams*
         .Initialised(OLESTR("Helper used before initialized."))
         .OutPointers(OLESTR(""), retrieval, units)
         .Clear(units)
-        .Require([&] { return retrieval->noOfElts == kUnitsRetrieveAll; }, E_INVALIDARG,
+        .Require([&] { return retrieval->noOfElts == kRetrieveAll; }, E_INVALIDARG,
                  OLESTR("GetPSCUnitStatus - Only the RetrieveAll retrieval mode is supported."))
         .Get(OLESTR("PSCUnitStatus"))
         .Decode([&](VARIANT* reply) { return UnpackPSCUnitStatus(reply, retrieval, units); });

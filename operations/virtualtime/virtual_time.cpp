@@ -9,9 +9,9 @@ namespace {
 
 // The set command carries the state with its "VT" prefix, the reply without.
 constexpr WordValue<TavVTState> kVtStateWords[] = {{OLESTR("VTStop"), VTStop},
-                                                 {OLESTR("VTFreeRun"), VTFreeRun},
-                                                 {OLESTR("VTRunSlice"), VTRunSlice},
-                                                 {OLESTR("VTNextEvent"), VTNextEvent}};
+                                                   {OLESTR("VTFreeRun"), VTFreeRun},
+                                                   {OLESTR("VTRunSlice"), VTRunSlice},
+                                                   {OLESTR("VTNextEvent"), VTNextEvent}};
 
 constexpr WordValue<TavVTState> kStateReplies[] = {{OLESTR("-VTState Stop"), VTStop},
                                                    {OLESTR("-VTState FreeRun"), VTFreeRun},
